@@ -1,0 +1,61 @@
+#include <norlithctl/QuillUserLib.h>
+
+#include <simhost/Call.h>
+#include <simhost/domains/Observations.h>
+
+#include <atomic>
+#include <cstdarg>
+#include <cstdio>
+
+namespace {
+
+// Whether the library is open (between Init and Close) in this process.
+std::atomic<bool> g_open{false};
+
+// Runs one call; every failure becomes -1, since nothing may cross the C boundary.
+template <class Body>
+int Guard(Body&& body) {
+    try {
+        body();
+        return 0;
+    } catch (...) {
+        return -1;
+    }
+}
+
+}  // namespace
+
+extern "C" int QuillUserLib_Init(void) {
+    return Guard([] {
+        simhost::Call call("QuillUserLib_Init");
+        g_open = true;
+    });
+}
+
+extern "C" int QuillUserLib_AddQuill(const char* format, ...) {
+    if (!format) return -1;
+    std::string text;
+    va_list args;
+    va_start(args, format);
+    va_list copy;
+    va_copy(copy, args);
+    int size = std::vsnprintf(nullptr, 0, format, copy);
+    va_end(copy);
+    if (size >= 0) {
+        text.resize(static_cast<std::size_t>(size) + 1);
+        std::vsnprintf(text.data(), text.size(), format, args);
+        text.resize(static_cast<std::size_t>(size));
+    }
+    va_end(args);
+    if (size < 0) return -1;
+    return Guard([&] {
+        simhost::Call call("QuillUserLib_AddQuill", simhost::Args().Add("message", text));
+        if (!g_open) throw simhost::HostError("the event library is not open");
+        simhost::observations::Post(call, text);
+    });
+}
+
+extern "C" void QuillUserLib_Close(void) {
+    Guard([] { simhost::Call call("QuillUserLib_Close"); });
+    g_open = false;
+}

@@ -1,0 +1,25 @@
+// Errors raised by the simulated host.
+//
+// HostError is what every host operation throws: a host that cannot be opened, a database error,
+// a value a rule refuses, or a fault set on the operation. Its text is the complete message a
+// user sees; the host-control library turns it into Ravel::Lib::RavelException at its boundary.
+// ScenarioError is a HostError raised while a scenario is parsed or validated; its text starts
+// with "scenario: " and the JSON location of the first problem.
+#pragma once
+
+#include <stdexcept>
+#include <string>
+
+namespace simhost {
+
+class HostError : public std::runtime_error {
+public:
+    explicit HostError(const std::string& message) : std::runtime_error(message) {}
+};
+
+class ScenarioError : public HostError {
+public:
+    explicit ScenarioError(const std::string& message) : HostError(message) {}
+};
+
+}  // namespace simhost

@@ -1,0 +1,117 @@
+#include <simhost/Host.h>
+
+#include <simhost/Domain.h>
+#include <simhost/Scenario.h>
+#include <simhost/Store.h>
+
+#include <cstdlib>
+#include <filesystem>
+
+#include <unistd.h>
+
+namespace simhost {
+
+// Generated at build time from scenarios/default.json.
+extern const char kDefaultScenarioText[];
+extern const std::size_t kDefaultScenarioSize;
+
+const std::string& DefaultScenario() {
+    static const std::string text(kDefaultScenarioText, kDefaultScenarioSize);
+    return text;
+}
+
+Host Host::FromEnvironment() { return Host(StateDirFromEnvironment()); }
+
+std::string Host::Root() const { return RootPath(dir_); }
+
+bool Host::Exists() const { return access(DatabasePath(dir_).c_str(), F_OK) == 0; }
+
+void Host::Init(const std::string& scenario_text, bool replace) {
+    Scenario scenario = ParseScenario(scenario_text);
+    InitHost(dir_, scenario, replace ? InitMode::Replace : InitMode::CreateOnly);
+}
+
+std::string Host::Export() {
+    Session session = Session::Open(dir_);
+    ReadTxn snapshot(session.db());
+    Scenario scenario;
+    for (const Domain* domain : Domains()) scenario.sections.push_back(domain->Read(session.db()));
+    scenario.faults = ReadFaults(session.db());
+    return ScenarioText(scenario);
+}
+
+void Host::AddFault(const std::string& operation, const std::string& message,
+                    std::optional<std::int64_t> times) {
+    Fault fault{operation, message, times};
+    std::string problem = CheckFault(fault);
+    if (!problem.empty()) throw HostError(problem);
+    Session session = Session::Open(dir_);
+    WriteTxn txn(session.db());
+    StoreFault(session.db(), fault);
+    txn.Commit();
+}
+
+std::vector<Fault> Host::Faults() {
+    Session session = Session::Open(dir_);
+    return ReadFaults(session.db());
+}
+
+void Host::ClearFaults() {
+    Session session = Session::Open(dir_);
+    WriteTxn txn(session.db());
+    DeleteFaults(session.db());
+    txn.Commit();
+}
+
+std::vector<JournalEntry> Host::Journal() {
+    Session session = Session::Open(dir_);
+    return ReadJournal(session.db());
+}
+
+void Host::ClearJournal() {
+    Session session = Session::Open(dir_);
+    WriteTxn txn(session.db());
+    DeleteJournal(session.db());
+    txn.Commit();
+}
+
+namespace {
+
+std::string MakeTempDir() {
+    const char* tmp = std::getenv("TMPDIR");
+    std::string pattern = std::string(tmp && *tmp ? tmp : "/tmp") + "/simhost-XXXXXX";
+    if (!mkdtemp(pattern.data())) throw HostError("cannot create a temporary directory");
+    return pattern;
+}
+
+std::optional<std::string> Environment(const char* name) {
+    const char* value = std::getenv(name);
+    if (!value) return std::nullopt;
+    return std::string(value);
+}
+
+}  // namespace
+
+TempHost::TempHost(const std::string& scenario_text)
+    : base_(MakeTempDir()), saved_env_(Environment("QUARN_HOST_STATE")), host_(base_ + "/host") {
+    try {
+        host_.Init(scenario_text);
+    } catch (...) {
+        std::error_code ignored;
+        std::filesystem::remove_all(base_, ignored);
+        throw;
+    }
+    setenv("QUARN_HOST_STATE", host_.Dir().c_str(), 1);
+}
+
+TempHost::~TempHost() {
+    CloseHost();
+    if (saved_env_)
+        setenv("QUARN_HOST_STATE", saved_env_->c_str(), 1);
+    else
+        unsetenv("QUARN_HOST_STATE");
+    std::error_code ignored;
+    std::filesystem::remove_all(base_, ignored);
+}
+
+}  // namespace simhost

@@ -1,0 +1,76 @@
+// The simulated host's administration API: create a host in a directory, export it, set and
+// list faults, read and clear the journal. quarnhost is built on it, and tests use it (with
+// TempHost and the call trace of Trace.h) to run code against a fresh host.
+//
+// A Host names a state directory; each method opens that host through the process-wide
+// connection (creating it from the default scenario on first use, except Init) and works in
+// its own transaction. Everything throws HostError with a one-line message; Init throws
+// ScenarioError for a bad scenario and HostExists when a host is there and replace is false.
+#pragma once
+
+#include <simhost/Error.h>
+#include <simhost/Faults.h>
+#include <simhost/Journal.h>
+#include <simhost/Operations.h>
+#include <simhost/Trace.h>
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace simhost {
+
+// The default scenario, embedded in the library at build time.
+const std::string& DefaultScenario();
+
+class Host {
+public:
+    explicit Host(std::string dir) : dir_(std::move(dir)) {}
+    // The host the libraries use: QUARN_HOST_STATE or the default location.
+    static Host FromEnvironment();
+
+    const std::string& Dir() const { return dir_; }
+    // DIR/root: the host's own file system.
+    std::string Root() const;
+    bool Exists() const;
+
+    // Creates the host from a scenario (validated first; nothing changes when it is refused).
+    // With replace, an existing host's whole state (faults and journal included) is replaced.
+    void Init(const std::string& scenario_text = DefaultScenario(), bool replace = false);
+    // The host's whole state as scenario text (faults included).
+    std::string Export();
+
+    // Sets a fault; times empty: every call fails; else the next `times` calls fail.
+    // Replaces a fault already set on the operation.
+    void AddFault(const std::string& operation, const std::string& message,
+                  std::optional<std::int64_t> times = std::nullopt);
+    std::vector<Fault> Faults();
+    void ClearFaults();
+
+    std::vector<JournalEntry> Journal();
+    void ClearJournal();
+
+private:
+    std::string dir_;
+};
+
+// A fresh host in a new temporary directory for one test: QUARN_HOST_STATE points at it while
+// the TempHost lives and is restored afterwards, when the directory is removed too.
+class TempHost {
+public:
+    explicit TempHost(const std::string& scenario_text = DefaultScenario());
+    ~TempHost();
+    TempHost(const TempHost&) = delete;
+    TempHost& operator=(const TempHost&) = delete;
+
+    Host& host() { return host_; }
+    const std::string& Dir() const { return host_.Dir(); }
+
+private:
+    std::string base_;  // the temporary directory; the host is base_/host
+    std::optional<std::string> saved_env_;
+    Host host_;
+};
+
+}  // namespace simhost

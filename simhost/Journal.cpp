@@ -1,0 +1,44 @@
+#include <simhost/Journal.h>
+
+#include <simhost/Db.h>
+
+#include <cstdio>
+#include <ctime>
+
+namespace simhost {
+
+void AppendJournal(Db& db, const std::string& kind, const std::string& operation,
+                   const std::string& arguments) {
+    db.Cached("INSERT INTO journal(time, kind, operation, arguments) VALUES (?1, ?2, ?3, ?4)")
+        ->Bind(1, UtcNow())
+        .Bind(2, kind)
+        .Bind(3, operation)
+        .Bind(4, arguments)
+        .Run();
+}
+
+std::vector<JournalEntry> ReadJournal(Db& db) {
+    std::vector<JournalEntry> entries;
+    Query select =
+        db.Cached("SELECT sequence, time, kind, operation, arguments FROM journal ORDER BY sequence");
+    while (select->Step())
+        entries.push_back(
+            {select->Int(0), select->Text(1), select->Text(2), select->Text(3), select->Text(4)});
+    return entries;
+}
+
+void DeleteJournal(Db& db) { db.Cached("DELETE FROM journal")->Run(); }
+
+std::string UtcNow() {
+    timespec now{};
+    clock_gettime(CLOCK_REALTIME, &now);
+    std::tm parts{};
+    gmtime_r(&now.tv_sec, &parts);
+    char text[64];
+    std::snprintf(text, sizeof text, "%04d-%02d-%02dT%02d:%02d:%02d.%03dZ", parts.tm_year + 1900,
+                  parts.tm_mon + 1, parts.tm_mday, parts.tm_hour, parts.tm_min, parts.tm_sec,
+                  static_cast<int>(now.tv_nsec / 1000000));
+    return text;
+}
+
+}  // namespace simhost

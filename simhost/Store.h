@@ -1,0 +1,73 @@
+// The host store: where a host lives, how it is created, opened and replaced, and the one
+// process-wide connection the libraries share.
+//
+// A host is a directory: host.db (SQLite, WAL, our application id and schema version) and root/
+// (the host's own files). Creation builds the database under a temporary name and renames it
+// into place while holding DIR/host.lock, so a concurrent opener sees either no host or a whole
+// one. Replacement happens in one write transaction on the existing database, so other
+// processes' connections stay valid.
+//
+// Session grants exclusive use of the process-wide connection (a recursive mutex is held for
+// the Session's lifetime). The connection is opened lazily for the directory asked for and
+// reopened when another directory is asked for, or after a fork. Everything here throws
+// HostError; opening failures read "Cannot open the simulated host at 'DIR': REASON".
+#pragma once
+
+#include <simhost/Db.h>
+#include <simhost/Scenario.h>
+
+#include <cstdint>
+#include <mutex>
+#include <string>
+
+namespace simhost {
+
+// The state directory: QUARN_HOST_STATE, else $XDG_STATE_HOME/quarncli/host (when absolute),
+// else $HOME/.local/state/quarncli/host.
+std::string StateDirFromEnvironment();
+
+std::string DatabasePath(const std::string& dir);
+std::string RootPath(const std::string& dir);
+
+// The schema version stored in every host database; derived from the DDL of the core tables and
+// of every domain, so any schema change makes older databases recognisably different.
+std::int32_t SchemaVersion();
+
+enum class InitMode {
+    OpenOrCreate,  // create from the scenario unless a host exists (first use)
+    CreateOnly,    // create; throw HostExists when a host exists
+    Replace,       // create, or replace an existing host's whole state
+};
+
+class HostExists : public HostError {
+public:
+    using HostError::HostError;
+};
+
+// Creates or replaces the host in dir from a validated scenario. Returns true when it created
+// or replaced the host, false when OpenOrCreate found one.
+bool InitHost(const std::string& dir, const Scenario& scenario, InitMode mode);
+
+class Session {
+public:
+    // The connection to the host in dir, created from the default scenario on first use.
+    static Session Open(const std::string& dir);
+    // The same for StateDirFromEnvironment().
+    static Session OpenCurrent();
+
+    Db& db() { return *db_; }
+    const std::string& dir() const { return *dir_; }
+
+private:
+    Session(std::unique_lock<std::recursive_mutex> lock, Db* db, const std::string* dir)
+        : lock_(std::move(lock)), db_(db), dir_(dir) {}
+
+    std::unique_lock<std::recursive_mutex> lock_;
+    Db* db_;
+    const std::string* dir_;
+};
+
+// Closes the process-wide connection (if any); the next Session opens again.
+void CloseHost();
+
+}  // namespace simhost
