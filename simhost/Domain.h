@@ -21,16 +21,6 @@
 
 namespace simhost {
 
-class Section {
-public:
-    virtual ~Section() = default;
-    // The section as it appears in a scenario (members in a fixed order).
-    virtual nlohmann::ordered_json ToJson() const = 0;
-    // Stores the section into the domain's tables, which are empty; runs inside the caller's
-    // write transaction.
-    virtual void Write(Db& db) const = 0;
-};
-
 class Domain {
 public:
     virtual ~Domain() = default;

@@ -22,7 +22,18 @@
 
 namespace simhost {
 
-class Section;
+class Db;
+
+// One domain's part of a scenario, as a plain value (see Domain.h).
+class Section {
+public:
+    virtual ~Section() = default;
+    // The section as it appears in a scenario (members in a fixed order).
+    virtual nlohmann::ordered_json ToJson() const = 0;
+    // Stores the section into the domain's tables, which are empty; runs inside the caller's
+    // write transaction.
+    virtual void Write(Db& db) const = 0;
+};
 
 // The scenario format this build reads and writes.
 constexpr int kScenarioFormat = 1;

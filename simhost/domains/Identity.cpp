@@ -112,7 +112,7 @@ public:
     }
 
     std::unique_ptr<Section> Parse(const nlohmann::json* value, const Location& at) const override {
-        if (!value) at.Fail("missing");
+        if (!value) Location().Fail("missing member '" + Name() + "'");
         ObjectReader reader(*value, at);
         Identity identity;
         for (const Rule& rule : kRules) {
