@@ -32,7 +32,7 @@ const std::string kGetStateless =
 
 nlohmann::json DefaultHost() { return nlohmann::json::parse(simhost::DefaultScenario()); }
 
-OutputPtr Run(const boost::shared_ptr<AutoCli::Command>& command) {
+OutputPtr Execute(const boost::shared_ptr<AutoCli::Command>& command) {
     OutputPtr output = CallSpec::Output::New();
     command->Execute(CallSpec::Input::New(), output);
     return output;
@@ -67,7 +67,7 @@ TEST_F(IdentityCommands, VersionFieldsAreSetBuildFirstFromTheRecord) {
     const nlohmann::json identity = DefaultHost()["identity"];
     simhost::trace::Take();
 
-    OutputPtr output = Run(VersionGet::New());
+    OutputPtr output = Execute(VersionGet::New());
 
     EXPECT_TRUE(output->GetErrors().empty());
     EXPECT_TRUE(output->IsComplete());
@@ -88,7 +88,7 @@ TEST_F(IdentityCommands, VersionFieldsAtTheRecordLimitsComeBackWhole) {
     scenario["identity"]["update"] = std::string(151, 'u');
     simhost::TempHost temp(scenario.dump());
 
-    OutputPtr output = Run(VersionGet::New());
+    OutputPtr output = Execute(VersionGet::New());
 
     EXPECT_EQ(Fields(output->GetResult()),
               (std::vector<std::string>{"Build=" + std::string(95, 'b'),
@@ -102,7 +102,7 @@ TEST_F(IdentityCommands, VersionFailuresIncludingConstructionCarryThePrefix) {
         SCOPED_TRACE(operation);
         simhost::TempHost temp;
         temp.host().AddFault(operation, "node 1238 is busy");
-        ExpectFailedWith(Run(VersionGet::New()),
+        ExpectFailedWith(Execute(VersionGet::New()),
                          "Unable to query product version: node 1238 is busy");
     }
 }
@@ -110,7 +110,7 @@ TEST_F(IdentityCommands, VersionFailuresIncludingConstructionCarryThePrefix) {
 TEST_F(IdentityCommands, UuidIsReturnedUnchanged) {
     simhost::TempHost temp;
     simhost::trace::Take();
-    OutputPtr output = Run(UuidGet::New());
+    OutputPtr output = Execute(UuidGet::New());
     boost::shared_ptr<MetaString> uuid = boost::dynamic_pointer_cast<MetaString>(output->GetResult());
     ASSERT_TRUE(uuid);
     EXPECT_EQ(uuid->GetValue(), DefaultHost()["identity"]["system_uuid"].get<std::string>());
@@ -121,7 +121,7 @@ TEST_F(IdentityCommands, UuidIsReturnedUnchanged) {
 TEST_F(IdentityCommands, UuidFailureIsTheHostMessageAlone) {
     simhost::TempHost temp;
     temp.host().AddFault(kGetUuid, "UUID not available");
-    ExpectFailedWith(Run(UuidGet::New()), "UUID not available");
+    ExpectFailedWith(Execute(UuidGet::New()), "UUID not available");
 }
 
 TEST_F(IdentityCommands, BootDeviceAsksForEachFieldInOrder) {
@@ -129,7 +129,7 @@ TEST_F(IdentityCommands, BootDeviceAsksForEachFieldInOrder) {
     const nlohmann::json identity = DefaultHost()["identity"];
     simhost::trace::Take();
 
-    OutputPtr output = Run(BootDeviceGet::New());
+    OutputPtr output = Execute(BootDeviceGet::New());
 
     EXPECT_TRUE(output->IsComplete());
     EXPECT_EQ(boost::dynamic_pointer_cast<MetaStruct>(output->GetResult())->GetName(),
@@ -150,7 +150,7 @@ TEST_F(IdentityCommands, BootDeviceEmptyAnswersAreEmptyFields) {
     scenario["identity"]["stateless_boot_nic_mac"] = "";
     simhost::TempHost temp(scenario.dump());
 
-    OutputPtr output = Run(BootDeviceGet::New());
+    OutputPtr output = Execute(BootDeviceGet::New());
 
     EXPECT_TRUE(output->GetErrors().empty());
     EXPECT_EQ(Fields(output->GetResult()),
@@ -162,7 +162,7 @@ TEST_F(IdentityCommands, BootDeviceFailureAtAnyStepLeavesNoPartialResult) {
         SCOPED_TRACE(operation);
         simhost::TempHost temp;
         temp.host().AddFault(operation, "boot options unreadable");
-        ExpectFailedWith(Run(BootDeviceGet::New()), "boot options unreadable");
+        ExpectFailedWith(Execute(BootDeviceGet::New()), "boot options unreadable");
     }
 }
 
