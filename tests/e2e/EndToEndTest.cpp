@@ -50,7 +50,7 @@ private:
 };
 
 // Runs a program with the arguments; standard output and error are captured.
-Result Run(const std::string& program, const std::vector<std::string>& args) {
+Result RunProgram(const std::string& program, const std::vector<std::string>& args) {
     TempDir io;
     const std::string outPath = io.path() + "/out", errPath = io.path() + "/err";
     posix_spawn_file_actions_t actions;
@@ -78,7 +78,7 @@ class EndToEnd : public ::testing::Test {
 protected:
     Result Cli(std::vector<std::string> args) {
         args.insert(args.begin(), {"--host-state", state_});
-        return Run(QUARNCLI, args);
+        return RunProgram(QUARNCLI, args);
     }
     Result Json(std::vector<std::string> args) {
         args.insert(args.begin(), {"--formatter", "json"});
@@ -86,7 +86,7 @@ protected:
     }
     Result Host(std::vector<std::string> args) {
         args.insert(args.begin(), {"--state", state_});
-        return Run(QUARNHOST, args);
+        return RunProgram(QUARNHOST, args);
     }
     ordered_json Identity() { return ordered_json::parse(ReadFile(DEFAULT_SCENARIO))["identity"]; }
 
@@ -194,7 +194,7 @@ TEST_F(EndToEnd, UnusableStateDirectoryIsOneClearError) {
 }
 
 TEST_F(EndToEnd, SchemaDescribesTheTree) {
-    const Result r = Run(QUARNCLI, {"--schema", "system"});
+    const Result r = RunProgram(QUARNCLI, {"--schema", "system"});
     ASSERT_EQ(r.status, 0) << r.err;
     const ordered_json system = ordered_json::parse(r.out);
     std::size_t namespaces = 0, commands = 0;
