@@ -1,0 +1,134 @@
+// The "simple" formatter: one "Field: value" line per field, for people reading a terminal.
+//
+//   Name:                   header line, unless show-header:Name is false
+//      Field: value unit    three blanks deeper than the header, also without it
+//      Nested:              a list of structures: its elements one level deeper still
+//
+// A list of structures prints its elements as blocks separated by blank lines, a list of scalars
+// one element per line, a scalar alone on its line.
+#include "engine/FormatCommon.h"
+
+#include <map>
+
+namespace Kitbase {
+namespace Engine {
+namespace {
+
+using namespace Fmt;
+
+const std::size_t kIndentStep = 3;
+
+class SimpleFormatter {
+public:
+    SimpleFormatter(const FormatParams& params, Writer& out) : params_(params), out_(out) {}
+
+    void Value(const MetaObject& result, const MetaObject* tmpl) {
+        if (result.GetType() == MetaObj::MetaTypeStruct) {
+            const MetaStruct& row = AsStruct(result);
+            Struct(row, TemplateFor(tmpl, row.GetName()), 0);
+        } else if (IsStructList(result)) {
+            const MetaList& list = AsList(result);
+            const MetaStruct* rowTemplate = ElementTemplate(list, tmpl);
+            const std::vector<boost::shared_ptr<MetaObject> >& rows = list.GetElements();
+            for (std::size_t i = 0; i < rows.size(); ++i) {
+                if (i > 0) out_.Put('\n');
+                const MetaStruct& row = AsStruct(*rows[i]);
+                Struct(row, TemplateFor(rowTemplate, row.GetName()), 0);
+            }
+        } else if (result.GetType() == MetaObj::MetaTypeList) {
+            const std::vector<boost::shared_ptr<MetaObject> >& items = AsList(result).GetElements();
+            for (std::size_t i = 0; i < items.size(); ++i) {
+                PutText(out_, items[i].get(), scratch_);
+                out_.Put('\n');
+            }
+        } else {
+            PutText(out_, &result, scratch_);
+            out_.Put('\n');
+        }
+    }
+
+private:
+    // Column layouts are kept per structure name, so that the rows of a list share one.
+    Columns& ColumnsOf(const MetaStruct& row, const MetaStruct* tmpl) {
+        std::map<std::string, Columns>::iterator it = columns_.find(row.GetName());
+        if (it == columns_.end() || templates_[row.GetName()] != tmpl) {
+            Columns& columns = columns_[row.GetName()];
+            columns.ResetFor(params_.Fields(row.GetName()), tmpl, false);
+            templates_[row.GetName()] = tmpl;
+            return columns;
+        }
+        return it->second;
+    }
+
+    void Struct(const MetaStruct& row, const MetaStruct* tmpl, std::size_t indent) {
+        const std::string& name = row.GetName();
+        if (params_.ShowHeader(name)) {
+            out_.PutRepeat(' ', indent);
+            out_.Put(name);
+            out_.Put(":\n", 2);
+        }
+        bool selected = !params_.Fields(name).empty();
+        Columns& columns = ColumnsOf(row, tmpl);
+        columns.Map(row);
+        // Copies: a nested structure of the same name maps the shared layout again.
+        std::vector<const MetaObject*> cells = columns.Cells();
+        std::vector<std::size_t> extras = columns.Extras();
+        for (std::size_t c = 0; c < cells.size(); ++c) {
+            Field(name, columns.Name(c), cells[c], FieldTemplate(tmpl, columns.Name(c)),
+                  indent + kIndentStep);
+        }
+        if (selected) return;
+        const std::vector<MetaStruct::Field>& fields = row.GetFields();
+        for (std::size_t e = 0; e < extras.size(); ++e) {
+            const MetaStruct::Field& field = fields[extras[e]];
+            Field(name, field.first, field.second.get(), nullptr, indent + kIndentStep);
+        }
+    }
+
+    void Field(const std::string& structName, const std::string& fieldName,
+               const MetaObject* value, const MetaObject* fieldTemplate, std::size_t indent) {
+        out_.PutRepeat(' ', indent);
+        out_.Put(fieldName);
+        out_.Put(':');
+        if (value != nullptr && IsStructList(*value)) {
+            out_.Put('\n');
+            const MetaList& list = AsList(*value);
+            const MetaStruct* rowTemplate = ElementTemplate(list, fieldTemplate);
+            const std::vector<boost::shared_ptr<MetaObject> >& rows = list.GetElements();
+            for (std::size_t i = 0; i < rows.size(); ++i) {
+                const MetaStruct& row = AsStruct(*rows[i]);
+                Struct(row, TemplateFor(rowTemplate, row.GetName()), indent + kIndentStep);
+            }
+            return;
+        }
+        scratch_.clear();
+        AppendText(scratch_, value);
+        if (!scratch_.empty()) {
+            out_.Put(' ');
+            out_.Put(scratch_);
+            const std::string* unit = params_.Unit(structName, fieldName);
+            if (unit != nullptr && value->GetType() != MetaObj::MetaTypeList) {
+                out_.Put(' ');
+                out_.Put(*unit);
+            }
+        }
+        out_.Put('\n');
+    }
+
+    const FormatParams& params_;
+    Writer& out_;
+    std::map<std::string, Columns> columns_;
+    std::map<std::string, const MetaStruct*> templates_;
+    std::string scratch_;
+};
+
+}  // namespace
+
+void RenderSimple(const RenderRequest& request, Writer& out) {
+    static const FormatParams kNone;
+    SimpleFormatter(request.params ? *request.params : kNone, out)
+        .Value(*request.result, request.resultTemplate);
+}
+
+}  // namespace Engine
+}  // namespace Kitbase

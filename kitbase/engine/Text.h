@@ -1,0 +1,79 @@
+// Text helpers shared by the parser, the formatters, help and the schema writer: strict number
+// and boolean parsing, UTF-8 measuring and repair, JSON and XML escaping into a Writer, word
+// wrapping, comma lists and the edit distance behind "did you mean" suggestions.
+//
+// Everything here is a pure function of its arguments; nothing throws except std::bad_alloc.
+#pragma once
+
+#include "engine/Writer.h"
+
+#include <kitbase/Export.h>
+
+#include <cstddef>
+#include <string>
+#include <vector>
+
+namespace Kitbase {
+namespace Engine {
+
+// Decimal 64-bit signed integer with an optional sign and nothing else (no blanks, no prefix).
+// False on empty text, junk or overflow; *value is untouched then.
+KITBASE_API bool ParseInt64(const std::string& text, long long* value);
+// true/false/yes/no/1/0 in any case. False for any other text.
+KITBASE_API bool ParseBool(const std::string& text, bool* value);
+
+// Length of the well-formed UTF-8 sequence starting at text (1 to 4), or 0 when the bytes there
+// are not one (stray continuation byte, overlong form, surrogate, beyond U+10FFFF, cut short).
+KITBASE_API std::size_t Utf8SequenceLength(const unsigned char* text, std::size_t left);
+// Columns the text takes on a terminal, counted as one per code point (bytes that are not UTF-8
+// continuation bytes).
+KITBASE_API std::size_t DisplayWidth(const char* text, std::size_t size);
+inline std::size_t DisplayWidth(const std::string& text) {
+    return DisplayWidth(text.data(), text.size());
+}
+// The byte offset just past the first `columns` code points of text (or size when shorter).
+KITBASE_API std::size_t OffsetOfColumn(const char* text, std::size_t size, std::size_t columns);
+
+// A JSON string literal (quotes included), escaped per RFC 8259: '"' and '\\' escaped, \b \f \n
+// \r \t in their short forms, other control characters as \u00XX, and every byte that is not
+// part of well-formed UTF-8 replaced by U+FFFD, so the output is always valid JSON.
+KITBASE_API void PutJsonString(Writer& out, const char* text, std::size_t size);
+inline void PutJsonString(Writer& out, const std::string& text) {
+    PutJsonString(out, text.data(), text.size());
+}
+// XML character data (attribute false) or an attribute value (attribute true) without quotes:
+// markup characters as entities, carriage return (and in attributes tab and newline) as
+// character references, and characters XML 1.0 cannot carry (other control characters, U+FFFE,
+// U+FFFF, malformed UTF-8) as U+FFFD.
+KITBASE_API void PutXmlText(Writer& out, const char* text, std::size_t size, bool attribute);
+inline void PutXmlText(Writer& out, const std::string& text, bool attribute) {
+    PutXmlText(out, text.data(), text.size(), attribute);
+}
+
+// Splits text into lines of at most width columns, breaking at blanks where possible and inside a
+// word only when the word alone is wider than the line. Existing newlines are kept as breaks.
+KITBASE_API std::vector<std::string> WrapWords(const std::string& text, std::size_t width);
+
+// The comma-separated items of text, each trimmed of blanks; empty items are dropped.
+KITBASE_API std::vector<std::string> SplitCommaList(const std::string& text);
+
+// Optimal string alignment distance (insertions, deletions, substitutions and transpositions of
+// neighbours), comparing ASCII letters without regard to case.
+KITBASE_API std::size_t EditDistance(const std::string& a, const std::string& b);
+// The candidates nearest to word: among those within a small distance that grows with the word's
+// length (a candidate the word begins counts as distance 1), the ones at the smallest distance,
+// at most five, in the candidates' order. Empty when none is near.
+KITBASE_API std::vector<std::string> NearestNames(const std::string& word,
+                                                  const std::vector<std::string>& candidates);
+// User text for a one-line message: in single quotes, control characters written as \n, \t or
+// \xNN, and cut to about 80 columns with "..." when longer.
+KITBASE_API std::string Quote(const std::string& text);
+
+// Each name in single quotes, for listing names in a message.
+KITBASE_API std::vector<std::string> QuoteEach(const std::vector<std::string>& names);
+
+// "a", "a or b", "a, b or c" (with the given last separator, e.g. " or ").
+KITBASE_API std::string JoinNames(const std::vector<std::string>& names, const char* last);
+
+}  // namespace Engine
+}  // namespace Kitbase

@@ -1,0 +1,343 @@
+// quarncli as a process, against the test plug-ins: listings, help, suggestions, parsing, the
+// ways a command ends (exit statuses 0, 1 and 2 with their stdout and stderr), formatter choice,
+// global options and broken plug-ins.
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include <algorithm>
+#include <cstdlib>
+#include <fcntl.h>
+#include <fstream>
+#include <sstream>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace {
+
+struct Outcome {
+    int status = -1;
+    std::string out;
+    std::string err;
+};
+
+std::string ReadFile(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::stringstream text;
+    text << in.rdbuf();
+    return text.str();
+}
+
+std::string TempPath(const char* stem) {
+    const char* dir = std::getenv("TMPDIR");
+    return std::string(dir ? dir : "/tmp") + "/kbcli-" + stem + "-" + std::to_string(getpid());
+}
+
+// Runs quarncli with args (no plug-in directory added) and extra environment settings
+// ("NAME=value", or "NAME" to remove one); stdout goes to outPath when given.
+Outcome QuarncliRaw(const std::vector<std::string>& args, const std::vector<std::string>& env = {},
+               const std::string& outPath = "") {
+    Outcome outcome;
+    const char* program = std::getenv("QUARNCLI");
+    if (program == nullptr) {
+        ADD_FAILURE() << "QUARNCLI is not set (ctest sets it to the built quarncli)";
+        return outcome;
+    }
+    std::string outFile = outPath.empty() ? TempPath("out") : outPath;
+    std::string errFile = TempPath("err");
+    pid_t pid = fork();
+    if (pid == 0) {
+        int out = open(outFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+        int err = open(errFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+        if (out < 0 || err < 0) _exit(127);
+        dup2(out, 1);
+        dup2(err, 2);
+        setenv("COLUMNS", "80", 1);
+        for (const std::string& setting : env) {
+            std::string::size_type eq = setting.find('=');
+            if (eq == std::string::npos) {
+                unsetenv(setting.c_str());
+            } else {
+                setenv(setting.substr(0, eq).c_str(), setting.substr(eq + 1).c_str(), 1);
+            }
+        }
+        std::vector<char*> argv;
+        argv.push_back(const_cast<char*>(program));
+        for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
+        argv.push_back(nullptr);
+        execv(program, argv.data());
+        _exit(127);
+    }
+    int status = 0;
+    waitpid(pid, &status, 0);
+    outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    if (outPath.empty()) outcome.out = ReadFile(outFile);
+    outcome.err = ReadFile(errFile);
+    if (outPath.empty()) unlink(outFile.c_str());
+    unlink(errFile.c_str());
+    return outcome;
+}
+
+// quarncli --plugin-dir <the good test plug-ins> args...
+Outcome Quarncli(const std::vector<std::string>& args, const std::vector<std::string>& env = {}) {
+    std::vector<std::string> all = {"--plugin-dir", KB_GOOD_PLUGINS};
+    all.insert(all.end(), args.begin(), args.end());
+    return QuarncliRaw(all, env);
+}
+
+// A usage error: status 2, nothing on stdout, exactly one line on stderr, returned.
+std::string UsageError(const std::vector<std::string>& args) {
+    Outcome outcome = Quarncli(args);
+    EXPECT_EQ(2, outcome.status);
+    EXPECT_EQ("", outcome.out);
+    EXPECT_EQ(1, std::count(outcome.err.begin(), outcome.err.end(), '\n')) << outcome.err;
+    return outcome.err;
+}
+
+TEST(Cli, NamespaceListsItsChildrenWithDescriptions) {
+    Outcome outcome = Quarncli({"kb"});
+    EXPECT_EQ(0, outcome.status);
+    EXPECT_EQ("", outcome.err);
+    EXPECT_EQ("Usage: quarncli [global options] kb <namespace|command> ... [options]\n"
+              "\n"
+              "Commands of the framework's test plug-in.\n"
+              "\n"
+              "Available namespaces:\n"
+              "  deep  A namespace two levels down.\n"
+              "\n"
+              "Available commands:\n"
+              "  echo       Echo what the input answers for every kind.\n"
+              "  need       Needs its required options.\n"
+              "  fail       Sets two errors.\n"
+              "  partial    Sets an error and a result.\n"
+              "  ravel      Throws a host-control exception.\n"
+              "  crash      Throws a standard exception.\n"
+              "  hoststate  Show QUARN_HOST_STATE.\n"
+              "  disks      List the disks.\n",
+              outcome.out);
+    EXPECT_EQ(outcome.out, Quarncli({"kb", "--help"}).out);
+    EXPECT_EQ(outcome.out, Quarncli({"--help", "kb"}).out);
+
+    Outcome root = Quarncli({});
+    EXPECT_EQ(0, root.status);
+    EXPECT_NE(std::string::npos, root.out.find("\nAvailable namespaces:\n  kb  Commands of"));
+    EXPECT_NE(std::string::npos, root.out.find("\nGlobal options (before the command words):\n"));
+    EXPECT_NE(std::string::npos, root.out.find("  --format-param KEY=VALUE  "));
+}
+
+TEST(Cli, CommandHelpShowsEveryParameter) {
+    Outcome outcome = Quarncli({"kb", "echo", "--help"});
+    EXPECT_EQ(0, outcome.status);
+    EXPECT_EQ("Usage: quarncli [global options] kb echo [options]\n"
+              "\n"
+              "Echo what the input answers for every kind.\n"
+              "\n"
+              "Options:\n"
+              "  -n, --name <string>  A name.\n"
+              "  -c, --count <int>    How many, 1 to 100. Range: 1 to 100.\n"
+              "  -e, --enable <bool>  On or off. Takes true, false, yes, no, 1 or 0.\n"
+              "  -f, --force          Do it anyway. Flag: takes no value.\n"
+              "  -w, --word <string>  Lower-case letters then digits. Must match: [a-z]+[0-9]*\n"
+              "  --big <int>          Any integer.\n",
+              outcome.out);
+    EXPECT_EQ(outcome.out, Quarncli({"--help", "kb", "echo"}).out);
+    EXPECT_EQ(outcome.out, Quarncli({"kb", "echo", "--bogus", "-h"}).out);
+    EXPECT_NE(std::string::npos,
+              Quarncli({"kb", "need", "-h"}).out.find("  -t, --target <string>  Where to go. Required."));
+    EXPECT_NE(std::string::npos, Quarncli({"kb", "fail", "--help"}).out.find("takes no options"));
+}
+
+TEST(Cli, InputAnswersForEveryKindAfterParsing) {
+    Outcome outcome = Quarncli({"--formatter", "keyvalue", "kb", "echo", "-n", "alpha", "--count=7",
+                           "--enable", "No", "-f", "--word", "abc12", "--big", "-9223372036854775808"});
+    ASSERT_EQ(0, outcome.status) << outcome.err;
+    EXPECT_EQ("", outcome.err);
+    const char* expected[] = {
+        "Echo.name.has=true",      "Echo.name.string=alpha",   "Echo.name.int=0",
+        "Echo.count.has=true",     "Echo.count.string=7",      "Echo.count.int=7",
+        "Echo.enable.has=true",    "Echo.enable.string=false", "Echo.enable.bool=false",
+        "Echo.force.has=true",     "Echo.force.flag=true",     "Echo.word.string=abc12",
+        "Echo.big.string=-9223372036854775808", "Echo.big.int=-9223372036854775808"};
+    for (const char* line : expected) {
+        EXPECT_NE(std::string::npos, outcome.out.find(std::string(line) + "\n")) << line;
+    }
+    // Parameters not given read as empty, 0 and false.
+    Outcome empty = Quarncli({"--formatter", "keyvalue", "kb", "echo"});
+    EXPECT_NE(std::string::npos,
+              empty.out.find("Echo.count.has=false\nEcho.count.string=\nEcho.count.int=0\n"
+                             "Echo.count.bool=false\nEcho.count.flag=false\n"));
+}
+
+TEST(Cli, UsageErrorsExitWithStatus2AndOneLine) {
+    EXPECT_EQ("quarncli: unknown option '--nmae'; did you mean '--name'?\n",
+              UsageError({"kb", "echo", "--nmae", "x"}));
+    EXPECT_EQ("quarncli: missing required options --target (-t) (a text value) and --level (a "
+              "decimal integer)\n",
+              UsageError({"kb", "need"}));
+    EXPECT_EQ("quarncli: option --count (-c) takes an integer from 1 to 100, got 101\n",
+              UsageError({"kb", "echo", "-c", "101"}));
+    EXPECT_EQ("quarncli: option --word (-w) takes a value matching '[a-z]+[0-9]*', got 'ab-1'\n",
+              UsageError({"kb", "echo", "--word=ab-1"}));
+    EXPECT_EQ("quarncli: option --name (-n) is given more than once\n",
+              UsageError({"kb", "echo", "-n", "a", "--name", "b"}));
+    EXPECT_EQ("quarncli: unexpected argument 'stray'; this command takes only options (--name "
+              "VALUE)\n",
+              UsageError({"kb", "echo", "-f", "stray"}));
+    EXPECT_EQ("quarncli: option --big takes a decimal integer, got '1e3'\n",
+              UsageError({"kb", "echo", "--big", "1e3"}));
+    // Global options belong before the command words.
+    EXPECT_EQ(0u, UsageError({"kb", "echo", "--formatter", "json"})
+                      .find("quarncli: unknown option '--formatter'"));
+    EXPECT_EQ(0u, UsageError({"kb", "--bogus"}).find("quarncli: unexpected '--bogus': name a "
+                                                     "command first"));
+}
+
+TEST(Cli, UnknownWordsNameTheNearestChildrenOrAllOfThem) {
+    EXPECT_EQ("quarncli: unknown command 'ehco' under 'kb'; did you mean 'echo'?\n",
+              UsageError({"kb", "ehco"}));
+    EXPECT_EQ("quarncli: unknown command 'dep' under 'kb'; did you mean 'deep'?\n",
+              UsageError({"kb", "dep", "deeper"}));
+    EXPECT_EQ("quarncli: unknown command 'qqqqqq' under 'kb'; valid: echo, need, fail, partial, "
+              "ravel, crash, hoststate, disks and deep\n",
+              UsageError({"kb", "qqqqqq"}));
+    EXPECT_EQ("quarncli: unknown command 'KB'; did you mean 'kb'?\n", UsageError({"KB"}));
+    EXPECT_EQ("quarncli: unknown command 'dne' under 'kb deep deeper'; did you mean 'done'?\n",
+              UsageError({"kb", "deep", "deeper", "dne"}));
+}
+
+TEST(Cli, GlobalOptionErrorsExitWithStatus2) {
+    EXPECT_EQ("quarncli: unknown formatter 'yaml'; choose simple, table, json, xml, csv or "
+              "keyvalue\n",
+              UsageError({"--formatter", "yaml", "kb", "echo"}));
+    EXPECT_EQ("quarncli: unknown global option '--formater'; did you mean '--formatter'?\n",
+              UsageError({"--formater=json", "kb"}));
+    EXPECT_EQ(0u, UsageError({"--format-param", "novalue", "kb", "disks"})
+                      .find("quarncli: global option '--format-param' takes KEY=VALUE"));
+    EXPECT_EQ("quarncli: global option '--formatter' is given more than once\n",
+              UsageError({"--formatter=json", "--formatter", "xml", "kb"}));
+    EXPECT_EQ("quarncli: global option '--host-state' needs a value\n",
+              UsageError({"--host-state"}));
+    EXPECT_EQ("quarncli: global option '--schema' takes no value\n",
+              UsageError({"--schema=yes"}));
+}
+
+TEST(Cli, CommandErrorsGoToStderrInOrderWithStatus1) {
+    Outcome fail = Quarncli({"kb", "fail"});
+    EXPECT_EQ(1, fail.status);
+    EXPECT_EQ("", fail.out);
+    EXPECT_EQ("Unable to open the vault: the door is stuck\nSecond complaint\n", fail.err);
+
+    Outcome partial = Quarncli({"kb", "partial"});
+    EXPECT_EQ(1, partial.status);
+    EXPECT_EQ("first item\n", partial.out);
+    EXPECT_EQ("Partly done: 1 of 2 items failed\n", partial.err);
+}
+
+TEST(Cli, ExceptionsFromCommandsAreCaughtWithStatus1) {
+    Outcome ravel = Quarncli({"kb", "ravel"});
+    EXPECT_EQ(1, ravel.status);
+    EXPECT_EQ("", ravel.out);
+    EXPECT_EQ("set before the throw\nHost refused: maintenance mode required\n", ravel.err);
+
+    Outcome crash = Quarncli({"kb", "crash"});
+    EXPECT_EQ(1, crash.status);
+    EXPECT_EQ("", crash.out);
+    EXPECT_EQ("quarncli: internal error in 'kb crash': wires crossed\n", crash.err);
+}
+
+TEST(Cli, FormatterAndFormatParamsSteerTheOutput) {
+    Outcome table = Quarncli({"kb", "disks"});
+    EXPECT_EQ(0, table.status);
+    EXPECT_EQ("Name     Size (B)  Note\n"
+              "-------  --------  ------------------------------------------\n"
+              "root     4096      boot volume\n"
+              "scratch  65536     fast temporary space for builds and caches\n",
+              table.out);
+    Outcome steered = Quarncli({"--format-param", "table-columns=Name,Mounted", "--format-param",
+                           "show-header:Disk=false", "kb", "disks"});
+    EXPECT_EQ("root     true\nscratch  false\n", steered.out);
+    Outcome wrapped = Quarncli({"--format-param=wrap-last=true", "kb", "disks"}, {"COLUMNS=40"});
+    EXPECT_EQ("Name     Size (B)  Note\n"
+              "-------  --------  ---------------------\n"
+              "root     4096      boot volume\n"
+              "scratch  65536     fast temporary space\n"
+              "                   for builds and caches\n",
+              wrapped.out);
+
+    Outcome json = Quarncli({"--formatter", "json", "kb", "disks"});
+    EXPECT_EQ(0, json.status);
+    nlohmann::json parsed = nlohmann::json::parse(json.out);
+    ASSERT_EQ(2u, parsed.size());
+    EXPECT_EQ(65536, parsed[1]["Size"]);
+    EXPECT_EQ(false, parsed[1]["Mounted"]);
+    // Commands without a default formatter print "simple".
+    EXPECT_EQ("true\n", Quarncli({"kb", "deep", "deeper", "done"}).out);
+}
+
+TEST(Cli, HostStateIsHandedToPluginsThroughTheEnvironment) {
+    EXPECT_EQ("/some/host dir\n", Quarncli({"--host-state", "/some/host dir", "kb", "hoststate"}).out);
+    EXPECT_EQ("/from/env\n", Quarncli({"kb", "hoststate"}, {"QUARN_HOST_STATE=/from/env"}).out);
+    EXPECT_EQ("/option/wins\n", Quarncli({"--host-state=/option/wins", "kb", "hoststate"},
+                                    {"QUARN_HOST_STATE=/from/env"})
+                                    .out);
+}
+
+TEST(Cli, SchemaDescribesTheTreeBelowThePath) {
+    Outcome outcome = Quarncli({"--schema", "kb", "deep"});
+    EXPECT_EQ(0, outcome.status);
+    nlohmann::json schema = nlohmann::json::parse(outcome.out);
+    EXPECT_EQ("deep", schema["name"]);
+    EXPECT_EQ("kb deep", schema["path"]);
+    EXPECT_EQ("kb deep deeper done", schema["children"][0]["children"][0]["path"]);
+    EXPECT_EQ("command", schema["children"][0]["children"][0]["kind"]);
+
+    nlohmann::json root = nlohmann::json::parse(Quarncli({"--schema"}).out);
+    EXPECT_EQ("", root["path"]);
+    EXPECT_EQ("kb", root["children"][0]["name"]);
+    EXPECT_EQ(0u, UsageError({"--schema", "kb", "nope"}).find("quarncli: unknown command 'nope'"));
+    EXPECT_EQ("quarncli: --schema takes command words only, got '--help'\n",
+              UsageError({"--schema", "kb", "--help"}));
+}
+
+TEST(Cli, BrokenPluginsAreReportedAndTheOthersStillServe) {
+    Outcome outcome = QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS, "kb", "deep", "deeper", "done"});
+    EXPECT_EQ(0, outcome.status);
+    EXPECT_EQ("true\n", outcome.out);
+    std::string dir = KB_MIXED_PLUGINS;
+    std::istringstream lines(outcome.err);
+    std::string line;
+    std::vector<std::string> reports;
+    while (std::getline(lines, line)) reports.push_back(line);
+    ASSERT_EQ(3u, reports.size()) << outcome.err;
+    // In name order: no entry point, the plug-in that throws, the file that is no library.
+    EXPECT_EQ("quarncli: plug-in '" + dir + "/libaa_noentry.so' has no entry point "
+              "AutoCli_RegisterNamespaces; skipped",
+              reports[0]);
+    EXPECT_EQ("quarncli: plug-in '" + dir + "/libzz_throwing.so' failed while registering its "
+              "commands: registration broke halfway",
+              reports[1]);
+    EXPECT_EQ(0u, reports[2].find("quarncli: cannot load plug-in '" + dir + "/notaplugin.so': "));
+    // What the throwing plug-in attached before it failed stays reachable.
+    EXPECT_NE(std::string::npos,
+              QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS}).out.find("  half  Registered before"));
+}
+
+TEST(Cli, MissingPluginDirectoryIsOneLine) {
+    Outcome outcome = QuarncliRaw({"--plugin-dir", "/nonexistent/plugins", "kb"});
+    EXPECT_EQ(2, outcome.status);
+    EXPECT_EQ("", outcome.out);
+    EXPECT_EQ("quarncli: cannot read the plug-in directory '/nonexistent/plugins': No such file "
+              "or directory\n",
+              outcome.err);
+}
+
+TEST(Cli, VersionAndWriteFailures) {
+    Outcome version = QuarncliRaw({"--version"});
+    EXPECT_EQ(0, version.status);
+    EXPECT_EQ("quarncli (Kitbase) 1.0.0\n", version.out);
+
+    Outcome full = QuarncliRaw({"--plugin-dir", KB_GOOD_PLUGINS, "kb", "disks"}, {}, "/dev/full");
+    EXPECT_EQ(1, full.status);
+    EXPECT_EQ("quarncli: cannot write the output: No space left on device\n", full.err);
+}
+
+}  // namespace
