@@ -10,6 +10,8 @@
 // with Secret() is recorded as "***" and its value never reaches the record.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Db.h>
 #include <simhost/Journal.h>
 #include <simhost/Store.h>
@@ -21,7 +23,7 @@
 
 namespace simhost {
 
-class Args {
+class SIMHOST_API Args {
 public:
     Args() : json_(nlohmann::ordered_json::object()) {}
     Args& Add(const std::string& name, nlohmann::ordered_json value) {
@@ -38,7 +40,7 @@ private:
     nlohmann::ordered_json json_;
 };
 
-class Call {
+class SIMHOST_API Call {
 public:
     explicit Call(std::string operation, Args args = Args());
     Call(const Call&) = delete;

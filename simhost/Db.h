@@ -7,6 +7,8 @@
 // committed is rolled back by its destructor. Every SQLite failure is thrown as HostError.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Error.h>
 
 #include <cstdint>
@@ -20,7 +22,7 @@ struct sqlite3_stmt;
 
 namespace simhost {
 
-class Stmt {
+class SIMHOST_API Stmt {
 public:
     Stmt(sqlite3* db, const std::string& sql);
     ~Stmt();
@@ -49,7 +51,7 @@ private:
 
 // A cached statement in use: bound and stepped through ->, reset when it goes out of scope so
 // that no statement keeps a read snapshot open after its caller is done with it.
-class Query {
+class SIMHOST_API Query {
 public:
     explicit Query(Stmt& stmt) : stmt_(stmt) {}
     ~Query() { stmt_.Reset(); }
@@ -61,7 +63,7 @@ private:
     Stmt& stmt_;
 };
 
-class Db {
+class SIMHOST_API Db {
 public:
     // Opens an existing database file read-write. Never creates one.
     explicit Db(const std::string& path, bool create = false);
@@ -87,7 +89,7 @@ private:
 };
 
 // BEGIN IMMEDIATE ... COMMIT; rolled back on destruction unless committed.
-class WriteTxn {
+class SIMHOST_API WriteTxn {
 public:
     explicit WriteTxn(Db& db);
     ~WriteTxn();
@@ -101,7 +103,7 @@ private:
 };
 
 // A deferred read transaction, so that several reads see one snapshot.
-class ReadTxn {
+class SIMHOST_API ReadTxn {
 public:
     explicit ReadTxn(Db& db);
     ~ReadTxn();

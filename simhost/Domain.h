@@ -10,6 +10,8 @@
 // Sections are plain values owned by whoever parsed or read them.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Db.h>
 #include <simhost/Scenario.h>
 
@@ -21,7 +23,7 @@
 
 namespace simhost {
 
-class Domain {
+class SIMHOST_API Domain {
 public:
     virtual ~Domain() = default;
     // The scenario member that holds this domain, e.g. "identity".
@@ -38,6 +40,6 @@ public:
 };
 
 // Every domain, in scenario order. Owned by the library; valid for the process's lifetime.
-const std::vector<const Domain*>& Domains();
+SIMHOST_API const std::vector<const Domain*>& Domains();
 
 }  // namespace simhost

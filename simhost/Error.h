@@ -7,17 +7,19 @@
 // with "scenario: " and the JSON location of the first problem.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <stdexcept>
 #include <string>
 
 namespace simhost {
 
-class HostError : public std::runtime_error {
+class SIMHOST_API HostError : public std::runtime_error {
 public:
     explicit HostError(const std::string& message) : std::runtime_error(message) {}
 };
 
-class ScenarioError : public HostError {
+class SIMHOST_API ScenarioError : public HostError {
 public:
     explicit ScenarioError(const std::string& message) : HostError(message) {}
 };

@@ -6,6 +6,8 @@
 // Operation names are checked against the registry in Operations.h.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <cstddef>
 #include <cstdint>
 #include <optional>
@@ -32,11 +34,11 @@ constexpr std::size_t kMaxFaultMessage = 4096;
 
 // "" when the fault can be set, else the reason (unknown operation with its nearest known names,
 // message too long or not UTF-8, count out of range).
-std::string CheckFault(const Fault& fault);
+SIMHOST_API std::string CheckFault(const Fault& fault);
 
 // Store access; the caller provides the transaction.
-void StoreFault(Db& db, const Fault& fault);  // replaces any fault on the same operation
-std::vector<Fault> ReadFaults(Db& db);         // sorted by operation
-void DeleteFaults(Db& db);
+SIMHOST_API void StoreFault(Db& db, const Fault& fault);  // replaces any fault on the same operation
+SIMHOST_API std::vector<Fault> ReadFaults(Db& db);         // sorted by operation
+SIMHOST_API void DeleteFaults(Db& db);
 
 }  // namespace simhost

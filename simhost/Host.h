@@ -8,6 +8,8 @@
 // ScenarioError for a bad scenario and HostExists when a host is there and replace is false.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Error.h>
 #include <simhost/Faults.h>
 #include <simhost/Journal.h>
@@ -22,9 +24,9 @@
 namespace simhost {
 
 // The default scenario, embedded in the library at build time.
-const std::string& DefaultScenario();
+SIMHOST_API const std::string& DefaultScenario();
 
-class Host {
+class SIMHOST_API Host {
 public:
     explicit Host(std::string dir) : dir_(std::move(dir)) {}
     // The host the libraries use: QUARN_HOST_STATE or the default location.
@@ -57,7 +59,7 @@ private:
 
 // A fresh host in a new temporary directory for one test: QUARN_HOST_STATE points at it while
 // the TempHost lives and is restored afterwards, when the directory is removed too.
-class TempHost {
+class SIMHOST_API TempHost {
 public:
     explicit TempHost(const std::string& scenario_text = DefaultScenario());
     ~TempHost();

@@ -5,6 +5,8 @@
 // entry commit or vanish together. Reads are not journaled (see Trace.h for the call trace).
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <cstdint>
 #include <string>
 #include <vector>
@@ -21,12 +23,12 @@ struct JournalEntry {
     std::string arguments;      // compact JSON object
 };
 
-void AppendJournal(Db& db, const std::string& kind, const std::string& operation,
+SIMHOST_API void AppendJournal(Db& db, const std::string& kind, const std::string& operation,
                    const std::string& arguments);
-std::vector<JournalEntry> ReadJournal(Db& db);
-void DeleteJournal(Db& db);
+SIMHOST_API std::vector<JournalEntry> ReadJournal(Db& db);
+SIMHOST_API void DeleteJournal(Db& db);
 
 // The current UTC time in the journal's format.
-std::string UtcNow();
+SIMHOST_API std::string UtcNow();
 
 }  // namespace simhost

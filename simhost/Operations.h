@@ -5,15 +5,17 @@
 // each domain's OperationNames(). The returned containers are owned by the library.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <cstddef>
 #include <string>
 #include <vector>
 
 namespace simhost {
 
-const std::vector<std::string>& KnownOperations();  // sorted, unique
-bool IsKnownOperation(const std::string& name);
+SIMHOST_API const std::vector<std::string>& KnownOperations();  // sorted, unique
+SIMHOST_API bool IsKnownOperation(const std::string& name);
 // The known names closest to name (edit distance, then order), at most count of them.
-std::vector<std::string> NearestOperations(const std::string& name, std::size_t count = 3);
+SIMHOST_API std::vector<std::string> NearestOperations(const std::string& name, std::size_t count = 3);
 
 }  // namespace simhost

@@ -7,6 +7,8 @@
 // them. Adding a node is one entry in the table in Records.cpp.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <cstddef>
 #include <string>
 #include <vector>
@@ -27,9 +29,9 @@ struct SysinfoNode {
 };
 
 // The node with this identifier, or nullptr.
-const SysinfoNode* FindSysinfoNode(int id);
+SIMHOST_API const SysinfoNode* FindSysinfoNode(int id);
 
 // Operation names of the kernel information reader, for the operation registry.
-std::vector<std::string> SysinfoOperationNames();
+SIMHOST_API std::vector<std::string> SysinfoOperationNames();
 
 }  // namespace simhost

@@ -10,6 +10,8 @@
 // Location and ObjectReader are the validation helpers every domain uses for its own section.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Error.h>
 #include <simhost/Faults.h>
 
@@ -25,7 +27,7 @@ namespace simhost {
 class Db;
 
 // One domain's part of a scenario, as a plain value (see Domain.h).
-class Section {
+class SIMHOST_API Section {
 public:
     virtual ~Section() = default;
     // The section as it appears in a scenario (members in a fixed order).
@@ -43,11 +45,11 @@ struct Scenario {
     std::vector<Fault> faults;                       // sorted by operation
 };
 
-Scenario ParseScenario(const std::string& text);
-std::string ScenarioText(const Scenario& scenario);
+SIMHOST_API Scenario ParseScenario(const std::string& text);
+SIMHOST_API std::string ScenarioText(const Scenario& scenario);
 
 // A position in a scenario document, e.g. "identity.product" or "faults[2].times".
-class Location {
+class SIMHOST_API Location {
 public:
     Location() = default;
     Location Member(const std::string& name) const;
@@ -61,7 +63,7 @@ private:
 };
 
 // Reads one JSON object member by member and refuses members it was not asked for.
-class ObjectReader {
+class SIMHOST_API ObjectReader {
 public:
     // Fails unless value is an object.
     ObjectReader(const nlohmann::json& value, Location at);
@@ -85,7 +87,7 @@ private:
 
 // Checks shared by scenario validation and host operations. Each returns "" when the value is
 // acceptable, else the reason (e.g. "expected a string of at most 31 bytes").
-std::string CheckText(const std::string& value, std::size_t max_bytes, bool allow_empty = true);
-bool IsValidUtf8(const std::string& value);
+SIMHOST_API std::string CheckText(const std::string& value, std::size_t max_bytes, bool allow_empty = true);
+SIMHOST_API bool IsValidUtf8(const std::string& value);
 
 }  // namespace simhost

@@ -13,6 +13,8 @@
 // HostError; opening failures read "Cannot open the simulated host at 'DIR': REASON".
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Db.h>
 #include <simhost/Scenario.h>
 
@@ -24,14 +26,14 @@ namespace simhost {
 
 // The state directory: QUARN_HOST_STATE, else $XDG_STATE_HOME/quarncli/host (when absolute),
 // else $HOME/.local/state/quarncli/host.
-std::string StateDirFromEnvironment();
+SIMHOST_API std::string StateDirFromEnvironment();
 
-std::string DatabasePath(const std::string& dir);
-std::string RootPath(const std::string& dir);
+SIMHOST_API std::string DatabasePath(const std::string& dir);
+SIMHOST_API std::string RootPath(const std::string& dir);
 
 // The schema version stored in every host database; derived from the DDL of the core tables and
 // of every domain, so any schema change makes older databases recognisably different.
-std::int32_t SchemaVersion();
+SIMHOST_API std::int32_t SchemaVersion();
 
 enum class InitMode {
     OpenOrCreate,  // create from the scenario unless a host exists (first use)
@@ -39,16 +41,16 @@ enum class InitMode {
     Replace,       // create, or replace an existing host's whole state
 };
 
-class HostExists : public HostError {
+class SIMHOST_API HostExists : public HostError {
 public:
     using HostError::HostError;
 };
 
 // Creates or replaces the host in dir from a validated scenario. Returns true when it created
 // or replaced the host, false when OpenOrCreate found one.
-bool InitHost(const std::string& dir, const Scenario& scenario, InitMode mode);
+SIMHOST_API bool InitHost(const std::string& dir, const Scenario& scenario, InitMode mode);
 
-class Session {
+class SIMHOST_API Session {
 public:
     // The connection to the host in dir, created from the default scenario on first use.
     static Session Open(const std::string& dir);
@@ -68,6 +70,6 @@ private:
 };
 
 // Closes the process-wide connection (if any); the next Session opens again.
-void CloseHost();
+SIMHOST_API void CloseHost();
 
 }  // namespace simhost

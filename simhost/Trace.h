@@ -4,6 +4,8 @@
 // disabled a call costs one atomic load.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <string>
 #include <vector>
 
@@ -17,18 +19,18 @@ struct TraceEntry {
 namespace trace {
 
 // Starts tracing (clearing anything recorded before); with_arguments also records arguments.
-void Enable(bool with_arguments = false);
+SIMHOST_API void Enable(bool with_arguments = false);
 // Stops tracing; what was recorded stays until Take().
-void Disable();
-bool Enabled();
+SIMHOST_API void Disable();
+SIMHOST_API bool Enabled();
 // Returns what was recorded and empties the list.
-std::vector<TraceEntry> Take();
+SIMHOST_API std::vector<TraceEntry> Take();
 // Only the operation names of Take().
-std::vector<std::string> TakeOperations();
+SIMHOST_API std::vector<std::string> TakeOperations();
 
 // Appends one call; used by Call.
-void Record(const std::string& operation, const std::string& arguments_json);
-bool WithArguments();
+SIMHOST_API void Record(const std::string& operation, const std::string& arguments_json);
+SIMHOST_API bool WithArguments();
 
 }  // namespace trace
 }  // namespace simhost

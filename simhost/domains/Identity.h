@@ -11,6 +11,8 @@
 // The limits are those of the product version record, so encoding never truncates.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Domain.h>
 
 #include <array>
@@ -46,15 +48,15 @@ constexpr std::size_t kBuildOffset = 64;
 constexpr std::size_t kUpdateOffset = 160;
 
 // Encodes the record; the fields must be within their limits (checked by Check/Parse).
-std::array<unsigned char, kProductVersionSize> EncodeProductVersion(const Identity& identity);
+SIMHOST_API std::array<unsigned char, kProductVersionSize> EncodeProductVersion(const Identity& identity);
 
 // "" when every field is acceptable, else "MEMBER: reason" for the first one that is not.
-std::string Check(const Identity& identity);
+SIMHOST_API std::string Check(const Identity& identity);
 
 // The host's current identity.
-Identity Read(Db& db);
+SIMHOST_API Identity Read(Db& db);
 
-const Domain& TheDomain();
+SIMHOST_API const Domain& TheDomain();
 
 }  // namespace identity
 }  // namespace simhost

@@ -5,6 +5,8 @@
 // {"time": "YYYY-MM-DDTHH:MM:SS.mmmZ", "message": text of 1..4096 bytes}, oldest first.
 #pragma once
 
+#include <simhost/Export.h>
+
 #include <simhost/Domain.h>
 
 #include <string>
@@ -25,11 +27,11 @@ struct Entry {
 
 // Appends an entry stamped with the host's current time; journaled. Throws HostError for a
 // message the log refuses (empty, too long, NUL, not UTF-8).
-void Post(Call& call, const std::string& message);
+SIMHOST_API void Post(Call& call, const std::string& message);
 
-std::vector<Entry> Read(Db& db);
+SIMHOST_API std::vector<Entry> Read(Db& db);
 
-const Domain& TheDomain();
+SIMHOST_API const Domain& TheDomain();
 
 }  // namespace observations
 }  // namespace simhost
