@@ -169,8 +169,9 @@ Scenario ParseScenario(const std::string& text) {
     };
     try {
         document = json::parse(text, watch);
-    } catch (const json::parse_error& error) {
-        // nlohmann's text reads "[json.exception.parse_error.101] parse error at line 1, ...".
+    } catch (const json::exception& error) {
+        // A syntax error, or a number too large to represent. nlohmann's text reads
+        // "[json.exception.parse_error.101] parse error at line 1, ...".
         std::string what = error.what();
         auto pos = what.find("] ");
         throw ScenarioError("scenario: not valid JSON: " +

@@ -60,6 +60,7 @@ TEST(ScenarioValidation, ReportsTheFirstProblemWithItsLocation) {
     } cases[] = {
         {"{", "scenario: not valid JSON: "},
         {"[]", "scenario: expected an object"},
+        {R"({"format": 1e999})", "scenario: not valid JSON: number overflow"},
         {R"({"identity": {}})", "scenario: missing member 'format'"},
         {EditedDefault("/format", 2), "scenario: format: expected 1"},
         {EditedDefault("/format", "1"), "scenario: format: expected 1"},
