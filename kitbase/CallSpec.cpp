@@ -86,7 +86,9 @@ void ParameterSpec::SetRequired(bool required) { required_ = required; }
 
 // ---- input specification ----
 
-boost::shared_ptr<InputSpec> InputSpec::New() { return boost::shared_ptr<InputSpec>(new InputSpec()); }
+boost::shared_ptr<InputSpec> InputSpec::New() {
+    return boost::shared_ptr<InputSpec>(new InputSpec());
+}
 
 InputSpec::~InputSpec() {}
 

@@ -119,7 +119,8 @@ void MetaStruct::SetField(const std::string& fieldName, const std::vector<std::s
     Put(fieldName, list);
 }
 
-void MetaStruct::SetField(const std::string& fieldName, const boost::shared_ptr<MetaString>& value) {
+void MetaStruct::SetField(const std::string& fieldName,
+                          const boost::shared_ptr<MetaString>& value) {
     Put(fieldName, value);
 }
 

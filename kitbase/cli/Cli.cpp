@@ -53,7 +53,8 @@ const std::vector<std::string>& GlobalOptionNames() {
     return names;
 }
 
-// The plug-in directory next to the running program: <dir of /proc/self/exe>/../lib/quarncli/plugins.
+// The plug-in directory next to the running program:
+// <directory of /proc/self/exe>/../lib/quarncli/plugins.
 std::string DefaultPluginDir() {
     char path[4096];
     ssize_t size = readlink("/proc/self/exe", path, sizeof path - 1);
@@ -106,7 +107,8 @@ public:
         boost::shared_ptr<AutoCli::Command> command =
             boost::dynamic_pointer_cast<AutoCli::Command>(node);
         if (!command) {
-            Error("internal error: '" + JoinPath(path_) + "' claims to be a command but is not one");
+            Error("internal error: '" + JoinPath(path_) +
+                  "' claims to be a command but is not one");
             return Finish(kExitFailed);
         }
         return Command(*command, rest);
@@ -170,7 +172,8 @@ private:
                 std::vector<std::string> near = Engine::NearestNames(name, GlobalOptionNames());
                 std::string message = "unknown global option " + Quote(name);
                 if (!near.empty()) {
-                    message += "; did you mean " + Engine::JoinNames(Engine::QuoteEach(near), " or ") + "?";
+                    message += "; did you mean " +
+                               Engine::JoinNames(Engine::QuoteEach(near), " or ") + "?";
                 } else {
                     message += "; global options are " +
                                Engine::JoinNames(GlobalOptionNames(), " and ") +
@@ -217,7 +220,9 @@ private:
             target = &options_.pluginDir;
         }
         if (*set) return UsageError("global option '" + name + "' is given more than once");
-        if (value.empty()) return UsageError("global option '" + name + "' needs a non-empty value");
+        if (value.empty()) {
+            return UsageError("global option '" + name + "' needs a non-empty value");
+        }
         if (name == "--formatter" && !Engine::IsFormatter(value)) {
             return UsageError("unknown formatter " + Quote(value) + "; choose " +
                               Engine::JoinNames(Engine::FormatterNames(), " or "));
@@ -258,7 +263,8 @@ private:
         } else {
             std::vector<std::string> near = Engine::NearestNames(word, names);
             if (!near.empty()) {
-                message += "; did you mean " + Engine::JoinNames(Engine::QuoteEach(near), " or ") + "?";
+                message +=
+                    "; did you mean " + Engine::JoinNames(Engine::QuoteEach(near), " or ") + "?";
             } else {
                 message += "; valid: " + Engine::JoinNames(names, " and ");
             }
@@ -296,11 +302,10 @@ private:
         // A namespace's help is its listing.
         for (std::size_t i = 0; i < rest.size(); ++i) {
             if (rest[i] == "--help" || rest[i] == "-h") continue;
-            std::string what = path_.empty() ? std::string("the command words")
-                                             : "'" + JoinPath(path_) + "', a namespace,";
-            Error("unexpected " + Quote(rest[i]) + ": name a command first (" + what +
-                  " takes no options; run '" + kProgramName +
-                  (path_.empty() ? "" : " " + JoinPath(path_)) + "' to list it)");
+            // Only reached below the root: global option parsing takes every leading option.
+            Error("unexpected " + Quote(rest[i]) + " after '" + JoinPath(path_) +
+                  "', which is a namespace: name one of its commands (run '" + kProgramName +
+                  " " + JoinPath(path_) + "' to list them)");
             return Finish(kExitUsage);
         }
         std::size_t width = Engine::TerminalWidth(outFd_);

@@ -126,7 +126,8 @@ private:
         std::string::size_type eq = typed.find('=');
         if (eq != std::string::npos) typed.erase(eq);
         std::vector<std::string> near = NearestNames(typed, names);
-        if (!near.empty()) return message + "; did you mean " + JoinNames(QuoteEach(near), " or ") + "?";
+        if (!near.empty())
+            return message + "; did you mean " + JoinNames(QuoteEach(near), " or ") + "?";
         return message + "; valid options: " + JoinNames(names, " and ");
     }
 
@@ -274,7 +275,8 @@ private:
         try {
             pattern.assign(constraint.GetPattern(), std::regex::ECMAScript);
         } catch (const std::regex_error& e) {
-            throw std::invalid_argument("option --" + name + " has a pattern that does not compile ('" +
+            throw std::invalid_argument("option --" + name +
+                                        " has a pattern that does not compile ('" +
                                         constraint.GetPattern() + "'): " + e.what());
         }
         bool matches = false;

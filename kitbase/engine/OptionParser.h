@@ -26,7 +26,7 @@ namespace Engine {
 
 struct ParseOutcome {
     enum Status { kOk, kHelp, kError };
-    Status status;
+    Status status = kOk;
     std::string error;                            // kError: the one-line refusal
     boost::shared_ptr<CallSpec::Input> input;     // kOk: the parsed values
 };

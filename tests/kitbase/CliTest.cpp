@@ -141,14 +141,16 @@ TEST(Cli, CommandHelpShowsEveryParameter) {
               outcome.out);
     EXPECT_EQ(outcome.out, Quarncli({"--help", "kb", "echo"}).out);
     EXPECT_EQ(outcome.out, Quarncli({"kb", "echo", "--bogus", "-h"}).out);
-    EXPECT_NE(std::string::npos,
-              Quarncli({"kb", "need", "-h"}).out.find("  -t, --target <string>  Where to go. Required."));
+    EXPECT_NE(
+        std::string::npos,
+        Quarncli({"kb", "need", "-h"}).out.find("  -t, --target <string>  Where to go. Required."));
     EXPECT_NE(std::string::npos, Quarncli({"kb", "fail", "--help"}).out.find("takes no options"));
 }
 
 TEST(Cli, InputAnswersForEveryKindAfterParsing) {
-    Outcome outcome = Quarncli({"--formatter", "keyvalue", "kb", "echo", "-n", "alpha", "--count=7",
-                           "--enable", "No", "-f", "--word", "abc12", "--big", "-9223372036854775808"});
+    Outcome outcome =
+        Quarncli({"--formatter", "keyvalue", "kb", "echo", "-n", "alpha", "--count=7", "--enable",
+                  "No", "-f", "--word", "abc12", "--big", "-9223372036854775808"});
     ASSERT_EQ(0, outcome.status) << outcome.err;
     EXPECT_EQ("", outcome.err);
     const char* expected[] = {
@@ -187,8 +189,9 @@ TEST(Cli, UsageErrorsExitWithStatus2AndOneLine) {
     // Global options belong before the command words.
     EXPECT_EQ(0u, UsageError({"kb", "echo", "--formatter", "json"})
                       .find("quarncli: unknown option '--formatter'"));
-    EXPECT_EQ(0u, UsageError({"kb", "--bogus"}).find("quarncli: unexpected '--bogus': name a "
-                                                     "command first"));
+    EXPECT_EQ("quarncli: unexpected '--bogus' after 'kb deep', which is a namespace: name one of "
+              "its commands (run 'quarncli kb deep' to list them)\n",
+              UsageError({"kb", "deep", "--bogus"}));
 }
 
 TEST(Cli, UnknownWordsNameTheNearestChildrenOrAllOfThem) {
@@ -274,7 +277,8 @@ TEST(Cli, FormatterAndFormatParamsSteerTheOutput) {
 }
 
 TEST(Cli, HostStateIsHandedToPluginsThroughTheEnvironment) {
-    EXPECT_EQ("/some/host dir\n", Quarncli({"--host-state", "/some/host dir", "kb", "hoststate"}).out);
+    EXPECT_EQ("/some/host dir\n",
+              Quarncli({"--host-state", "/some/host dir", "kb", "hoststate"}).out);
     EXPECT_EQ("/from/env\n", Quarncli({"kb", "hoststate"}, {"QUARN_HOST_STATE=/from/env"}).out);
     EXPECT_EQ("/option/wins\n", Quarncli({"--host-state=/option/wins", "kb", "hoststate"},
                                     {"QUARN_HOST_STATE=/from/env"})
@@ -299,7 +303,8 @@ TEST(Cli, SchemaDescribesTheTreeBelowThePath) {
 }
 
 TEST(Cli, BrokenPluginsAreReportedAndTheOthersStillServe) {
-    Outcome outcome = QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS, "kb", "deep", "deeper", "done"});
+    Outcome outcome =
+        QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS, "kb", "deep", "deeper", "done"});
     EXPECT_EQ(0, outcome.status);
     EXPECT_EQ("true\n", outcome.out);
     std::string dir = KB_MIXED_PLUGINS;
@@ -317,8 +322,9 @@ TEST(Cli, BrokenPluginsAreReportedAndTheOthersStillServe) {
               reports[1]);
     EXPECT_EQ(0u, reports[2].find("quarncli: cannot load plug-in '" + dir + "/notaplugin.so': "));
     // What the throwing plug-in attached before it failed stays reachable.
-    EXPECT_NE(std::string::npos,
-              QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS}).out.find("  half  Registered before"));
+    EXPECT_NE(
+        std::string::npos,
+        QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS}).out.find("  half  Registered before"));
 }
 
 TEST(Cli, MissingPluginDirectoryIsOneLine) {

@@ -149,9 +149,10 @@ TEST_F(OptionParserTest, MissingValues) {
     EXPECT_EQ("option --name (-n) needs a value (a text value); write --name=VALUE for a value "
               "starting with '-'",
               Refusal({"--name", "--force"}));
-    EXPECT_EQ("option --count (-c) needs a value (an integer from 1 to 10); write --count=VALUE for a "
-              "value starting with '-'",
-              Refusal({"-c", "-f"}));
+    EXPECT_EQ(
+        "option --count (-c) needs a value (an integer from 1 to 10); write --count=VALUE for a "
+        "value starting with '-'",
+        Refusal({"-c", "-f"}));
 }
 
 TEST_F(OptionParserTest, StrayPositionalWordsAreRefused) {

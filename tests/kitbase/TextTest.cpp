@@ -143,7 +143,8 @@ TEST(Text, SuggestionsFindTyposTranspositionsAndPrefixes) {
     EXPECT_TRUE(NearestNames("m", {"module", "mirafs"}).empty());
     EXPECT_EQ((std::vector<std::string>{"mirafs"}), NearestNames("mi", {"module", "mirafs"}));
     // Only the nearest are named, in the candidates' order.
-    EXPECT_EQ((std::vector<std::string>{"set", "get"}), NearestNames("bet", {"set", "list", "get"}));
+    EXPECT_EQ((std::vector<std::string>{"set", "get"}),
+              NearestNames("bet", {"set", "list", "get"}));
     EXPECT_TRUE(NearestNames("zzzzzz", children).empty());
     EXPECT_TRUE(NearestNames("boo", {}).empty());
 }

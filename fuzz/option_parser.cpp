@@ -1,0 +1,99 @@
+// libFuzzer target over the command-option parser.
+//
+// The first byte picks one of a few input specifications (every kind with range and regex
+// constraints and required parameters; one that claims -h; one without parameters); the rest,
+// split at NUL bytes, is the argument list. Whatever the words, the parser must answer with
+// exactly one outcome: accepted (every given parameter readable), help, or a single-line
+// refusal. Run by hand:  build-fw-clang/bin/fuzz_option_parser -max_total_time=60
+#include "engine/OptionParser.h"
+
+#include <kitbase/CallSpec.h>
+
+#include <cstdint>
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+namespace {
+
+using namespace Kitbase::CallSpec;
+
+boost::shared_ptr<ParameterSpec> Param(const boost::shared_ptr<InputSpec>& spec, const char* name,
+                                       const char* letter, ParameterType type, bool required) {
+    boost::shared_ptr<ParameterSpec> parameter = ParameterSpec::New(name, type);
+    if (letter) parameter->SetShortName(letter);
+    parameter->SetRequired(required);
+    spec->AddParameter(parameter);
+    return parameter;
+}
+
+std::vector<boost::shared_ptr<InputSpec> > Specs() {
+    std::vector<boost::shared_ptr<InputSpec> > specs;
+
+    boost::shared_ptr<InputSpec> rich = InputSpec::New();
+    Param(rich, "name", "n", ParameterTypeString, false);
+    boost::shared_ptr<ParameterConstraint> range = ParameterConstraint::New(ConstraintIntRange);
+    range->SetIntRange(-100, 100);
+    Param(rich, "count", "c", ParameterTypeInt, false)->AddConstraint(range);
+    Param(rich, "big", nullptr, ParameterTypeInt, false);
+    Param(rich, "enable", "e", ParameterTypeBool, false);
+    Param(rich, "force", "f", ParameterTypeFlag, false);
+    boost::shared_ptr<ParameterConstraint> regex = ParameterConstraint::New(ConstraintStringRegex);
+    regex->SetStringRegex("([a-z]+|[0-9]{1,3}(\\.[0-9]{1,3}){3})(:[0-9]+)?");
+    Param(rich, "target", "t", ParameterTypeString, false)->AddConstraint(regex);
+    specs.push_back(rich);
+
+    boost::shared_ptr<InputSpec> strict = InputSpec::New();
+    Param(strict, "host", "h", ParameterTypeString, true);
+    Param(strict, "port", "p", ParameterTypeInt, true);
+    Param(strict, "quiet", "q", ParameterTypeFlag, false);
+    specs.push_back(strict);
+
+    specs.push_back(InputSpec::New());
+    return specs;
+}
+
+}  // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    static const std::vector<boost::shared_ptr<InputSpec> > specs = Specs();
+    if (size == 0) return 0;
+    const InputSpec& spec = *specs[data[0] % specs.size()];
+    std::vector<std::string> args;
+    std::string current;
+    for (size_t i = 1; i < size; ++i) {
+        if (data[i] == 0) {
+            args.push_back(current);
+            current.clear();
+        } else {
+            current += static_cast<char>(data[i]);
+        }
+    }
+    if (size > 1) args.push_back(current);
+
+    Kitbase::Engine::ParseOutcome outcome = Kitbase::Engine::ParseOptions(spec, args);
+    switch (outcome.status) {
+        case Kitbase::Engine::ParseOutcome::kOk: {
+            if (!outcome.input) abort();
+            const std::vector<boost::shared_ptr<ParameterSpec> >& parameters =
+                spec.GetParameters();
+            for (size_t i = 0; i < parameters.size(); ++i) {
+                const std::string& name = parameters[i]->GetName();
+                if (parameters[i]->IsRequired() && !outcome.input->HasValue(name)) abort();
+                (void)outcome.input->GetString(name);
+                (void)outcome.input->GetInt(name);
+                (void)outcome.input->GetBool(name);
+            }
+            break;
+        }
+        case Kitbase::Engine::ParseOutcome::kHelp:
+            break;
+        case Kitbase::Engine::ParseOutcome::kError:
+            if (outcome.error.empty() || outcome.error.find('\n') != std::string::npos ||
+                outcome.input) {
+                abort();
+            }
+            break;
+    }
+    return 0;
+}
