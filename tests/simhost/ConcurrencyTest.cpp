@@ -11,7 +11,9 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <atomic>
 #include <set>
+#include <thread>
 
 #include <unistd.h>
 
@@ -179,6 +181,32 @@ TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
         simtest::RunQuarnhost({"--state", host.Dir(), "init", "--force", "--scenario",
                                simtest::ScenarioFile(round % 2 ? "default.json" : "stateless.json")});
     for (int pid : pids) EXPECT_EQ(simtest::WaitChild(pid), 0);
+}
+
+TEST_F(ConcurrencyTest, ThreadsShareTheProcessConnectionSafely) {
+    simhost::TempHost host;
+    host.host().AddFault(kGetUuid, "counted", 5);
+    ASSERT_EQ(QuillUserLib_Init(), 0);
+    std::atomic<int> failures{0}, wrong{0};
+    std::vector<std::thread> threads;
+    for (int t = 0; t < 4; ++t)
+        threads.emplace_back([&, t] {
+            for (int i = 0; i < 20; ++i) {
+                try {
+                    if (NorlithCtl::System::SystemInfoImpl().GetSystemUuid() !=
+                        "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c")
+                        ++wrong;
+                } catch (const Ravel::Lib::RavelException&) {
+                    ++failures;
+                }
+                if (QuillUserLib_AddQuill("thread %d entry %d", t, i) != 0) ++wrong;
+            }
+        });
+    for (auto& thread : threads) thread.join();
+    QuillUserLib_Close();
+    EXPECT_EQ(wrong, 0);
+    EXPECT_EQ(failures, 5);
+    EXPECT_EQ(nlohmann::json::parse(host.host().Export())["observations"].size(), 81u);
 }
 
 }  // namespace
