@@ -4,7 +4,8 @@
 // a value a rule refuses, or a fault set on the operation. Its text is the complete message a
 // user sees; the host-control library turns it into Ravel::Lib::RavelException at its boundary.
 // ScenarioError is a HostError raised while a scenario is parsed or validated; its text starts
-// with "scenario: " and the JSON location of the first problem.
+// with "scenario: " and the JSON location of the first problem. HostExists refuses to create a
+// host over an existing one.
 #pragma once
 
 #include <simhost/Export.h>
@@ -22,6 +23,12 @@ public:
 class SIMHOST_API ScenarioError : public HostError {
 public:
     explicit ScenarioError(const std::string& message) : HostError(message) {}
+};
+
+// Raised when a host is to be created where one already exists.
+class SIMHOST_API HostExists : public HostError {
+public:
+    explicit HostExists(const std::string& message) : HostError(message) {}
 };
 
 }  // namespace simhost

@@ -41,11 +41,6 @@ enum class InitMode {
     Replace,       // create, or replace an existing host's whole state
 };
 
-class SIMHOST_API HostExists : public HostError {
-public:
-    using HostError::HostError;
-};
-
 // Creates or replaces the host in dir from a validated scenario. Returns true when it created
 // or replaced the host, false when OpenOrCreate found one.
 SIMHOST_API bool InitHost(const std::string& dir, const Scenario& scenario, InitMode mode);
