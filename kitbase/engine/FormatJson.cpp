@@ -8,6 +8,7 @@
 
 #include "engine/Text.h"
 
+#include <deque>
 #include <map>
 
 namespace Kitbase {
@@ -54,8 +55,9 @@ public:
 
 private:
     std::map<std::string, Layout> layouts_;
-    std::vector<std::vector<const MetaObject*> > cells_;
-    std::vector<std::vector<std::size_t> > extras_;
+    // Deques: growing them for a deeper level keeps the outer levels' vectors in place.
+    std::deque<std::vector<const MetaObject*> > cells_;
+    std::deque<std::vector<std::size_t> > extras_;
 };
 
 // ---- json ----

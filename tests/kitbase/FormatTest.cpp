@@ -353,6 +353,13 @@ TEST_F(FormatTest, XmlHasOneElementPerStructureAndField) {
               "  </structure>\n"
               "</output>\n",
               Render("xml", *odd));
+    std::string host = Render("xml", *HostWithDisks());
+    EXPECT_NE(std::string::npos, host.find("    <field name=\"Disks\">\n"
+                                           "      <list>\n"
+                                           "        <structure name=\"Disk\">\n"
+                                           "          <field name=\"Name\"><string>d0</string>"
+                                           "</field>\n"))
+        << host;
     EXPECT_EQ("<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<output>\n  <bool>true</bool>\n"
               "</output>\n",
               Render("xml", *MetaBool::New(true)));
