@@ -1,6 +1,8 @@
 // The command tree: namespaces, commands and their attachment.
 #include <kitbase/AutoCli.h>
 
+#include "engine/Text.h"
+
 #include <stdexcept>
 
 namespace Kitbase {
@@ -104,34 +106,19 @@ void Command::Execute(const boost::shared_ptr<CallSpec::Input>& input,
     ExecuteInternal(input, output);
 }
 
-namespace {
-void SetKey(std::vector<Command::KeyValue>& list, const std::string& key,
-            const std::string& value) {
-    for (std::size_t i = 0; i < list.size(); ++i) {
-        if (list[i].first == key) {
-            list[i].second = value;
-            return;
-        }
-    }
-    list.push_back(Command::KeyValue(key, value));
-}
-}  // namespace
-
 void Command::SetDefaultOutputFormatter(const std::string& name) { formatter_ = name; }
 
 void Command::SetDefaultOutputParameter(const std::string& key, const std::string& value) {
-    SetKey(output_params_, key, value);
+    Engine::SetKey(output_params_, key, value);
 }
 
 void Command::SetMetaDataField(const std::string& key, const std::string& value) {
-    SetKey(metadata_, key, value);
+    Engine::SetKey(metadata_, key, value);
 }
 
 std::string Command::GetMetaDataField(const std::string& key) const {
-    for (std::size_t i = 0; i < metadata_.size(); ++i) {
-        if (metadata_[i].first == key) return metadata_[i].second;
-    }
-    return std::string();
+    const std::string* value = Engine::FindKey(metadata_, key);
+    return value ? *value : std::string();
 }
 
 }  // namespace AutoCli

@@ -1,6 +1,8 @@
 // Meta objects: scalars, structures and lists that commands return.
 #include <kitbase/MetaObj.h>
 
+#include "engine/Format.h"
+
 #include <stdexcept>
 
 namespace Kitbase {
@@ -145,19 +147,6 @@ boost::shared_ptr<MetaObject> MetaStruct::GetField(const std::string& fieldName)
 
 // ---- lists ----
 
-namespace {
-const char* KindName(MetaType type) {
-    switch (type) {
-        case MetaTypeBool: return "bool";
-        case MetaTypeInt: return "int";
-        case MetaTypeString: return "string";
-        case MetaTypeStruct: return "struct";
-        case MetaTypeList: return "list";
-    }
-    return "unknown";
-}
-}  // namespace
-
 boost::shared_ptr<MetaList> MetaList::New(MetaType elementType) {
     return New(elementType, boost::shared_ptr<MetaStruct>());
 }
@@ -169,7 +158,7 @@ boost::shared_ptr<MetaList> MetaList::New(MetaType elementType,
         case MetaTypeInt:
         case MetaTypeString:
             if (structTemplate) {
-                throw std::invalid_argument(std::string("MetaList of ") + KindName(elementType) +
+                throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(elementType) +
                                             " given a structure template");
             }
             break;
@@ -186,8 +175,8 @@ MetaType MetaList::GetType() const { return MetaTypeList; }
 void MetaList::AddValue(const boost::shared_ptr<MetaObject>& value) {
     if (!value) throw std::invalid_argument("MetaList: null element");
     if (value->GetType() != element_type_) {
-        throw std::invalid_argument(std::string("MetaList of ") + KindName(element_type_) +
-                                    ": cannot add a " + KindName(value->GetType()));
+        throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(element_type_) +
+                                    ": cannot add a " + Engine::MetaKindName(value->GetType()));
     }
     elements_.push_back(value);
 }
@@ -196,7 +185,7 @@ void MetaList::AddStruct(const boost::shared_ptr<MetaStruct>& value) { AddValue(
 
 void MetaList::AddString(const std::string& value) {
     if (element_type_ != MetaTypeString) {
-        throw std::invalid_argument(std::string("MetaList of ") + KindName(element_type_) +
+        throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(element_type_) +
                                     ": cannot add a string");
     }
     elements_.push_back(MetaString::New(value));

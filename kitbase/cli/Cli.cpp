@@ -64,15 +64,6 @@ std::string DefaultPluginDir() {
     return dir + "/../lib/quarncli/plugins";
 }
 
-std::string JoinPath(const std::vector<std::string>& words) {
-    std::string joined;
-    for (std::size_t i = 0; i < words.size(); ++i) {
-        if (i > 0) joined += ' ';
-        joined += words[i];
-    }
-    return joined;
-}
-
 class Session {
 public:
     Session(const std::vector<std::string>& args, int outFd, int errFd)
@@ -107,7 +98,7 @@ public:
         boost::shared_ptr<AutoCli::Command> command =
             boost::dynamic_pointer_cast<AutoCli::Command>(node);
         if (!command) {
-            Error("internal error: '" + JoinPath(path_) +
+            Error("internal error: '" + Engine::JoinWords(path_) +
                   "' claims to be a command but is not one");
             return Finish(kExitFailed);
         }
@@ -256,7 +247,7 @@ private:
         std::vector<std::string> names;
         const std::vector<AutoCli::NamespaceNode::Child>& children = node.GetChildren();
         for (std::size_t i = 0; i < children.size(); ++i) names.push_back(children[i].first);
-        std::string where = path_.empty() ? std::string() : " under '" + JoinPath(path_) + "'";
+        std::string where = path_.empty() ? std::string() : " under '" + Engine::JoinWords(path_) + "'";
         std::string message = "unknown command " + Quote(word) + where;
         if (names.empty()) {
             message += path_.empty() ? "; no plug-in has registered any command" : "; it is empty";
@@ -275,7 +266,7 @@ private:
 
     std::string Usage(bool command) const {
         std::string usage = std::string(kProgramName) + " [global options]";
-        if (!path_.empty()) usage += " " + JoinPath(path_);
+        if (!path_.empty()) usage += " " + Engine::JoinWords(path_);
         usage += command ? " [options]" : " <namespace|command> ... [options]";
         return usage;
     }
@@ -303,9 +294,9 @@ private:
         for (std::size_t i = 0; i < rest.size(); ++i) {
             if (rest[i] == "--help" || rest[i] == "-h") continue;
             // Only reached below the root: global option parsing takes every leading option.
-            Error("unexpected " + Quote(rest[i]) + " after '" + JoinPath(path_) +
+            Error("unexpected " + Quote(rest[i]) + " after '" + Engine::JoinWords(path_) +
                   "', which is a namespace: name one of its commands (run '" + kProgramName +
-                  " " + JoinPath(path_) + "' to list them)");
+                  " " + Engine::JoinWords(path_) + "' to list them)");
             return Finish(kExitUsage);
         }
         std::size_t width = Engine::TerminalWidth(outFd_);
@@ -363,7 +354,7 @@ private:
     }
 
     int Command(AutoCli::Command& command, const std::vector<std::string>& rest) {
-        const std::string where = "'" + JoinPath(path_) + "'";
+        const std::string where = "'" + Engine::JoinWords(path_) + "'";
         std::size_t width = Engine::TerminalWidth(outFd_);
         bool help = options_.help;
         boost::shared_ptr<CallSpec::InputSpec> inputSpec;

@@ -11,21 +11,10 @@ namespace Engine {
 // ---- parameters ----
 
 void FormatParams::Set(const std::string& key, const std::string& value) {
-    for (std::size_t i = 0; i < params_.size(); ++i) {
-        if (params_[i].first == key) {
-            params_[i].second = value;
-            return;
-        }
-    }
-    params_.push_back(KeyValue(key, value));
+    SetKey(params_, key, value);
 }
 
-const std::string* FormatParams::Get(const std::string& key) const {
-    for (std::size_t i = 0; i < params_.size(); ++i) {
-        if (params_[i].first == key) return &params_[i].second;
-    }
-    return nullptr;
-}
+const std::string* FormatParams::Get(const std::string& key) const { return FindKey(params_, key); }
 
 std::vector<std::string> FormatParams::Fields(const std::string& structName) const {
     const std::string* value = Get("fields:" + structName);
@@ -54,6 +43,17 @@ bool FormatParams::WrapLast() const {
     const std::string* value = Get("wrap-last");
     bool wrap = false;
     return value && ParseBool(*value, &wrap) && wrap;
+}
+
+const char* MetaKindName(MetaObj::MetaType type) {
+    switch (type) {
+        case MetaObj::MetaTypeBool: return "bool";
+        case MetaObj::MetaTypeInt: return "int";
+        case MetaObj::MetaTypeString: return "string";
+        case MetaObj::MetaTypeStruct: return "struct";
+        case MetaObj::MetaTypeList: return "list";
+    }
+    return "unknown";
 }
 
 // ---- dispatch ----

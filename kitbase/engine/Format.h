@@ -58,6 +58,9 @@ struct RenderRequest {
     std::size_t width = 80;                               // terminal columns (table wrap-last)
 };
 
+// The kind's name as the schema and messages print it: bool, int, string, struct, list.
+KITBASE_API const char* MetaKindName(MetaObj::MetaType type);
+
 // The formatter names, in the order help and refusals list them.
 KITBASE_API const std::vector<std::string>& FormatterNames();
 KITBASE_API bool IsFormatter(const std::string& name);

@@ -1,6 +1,7 @@
 // Schema output: the command tree as indented JSON.
 #include "engine/Schema.h"
 
+#include "engine/Format.h"
 #include "engine/OptionParser.h"
 #include "engine/Text.h"
 
@@ -107,18 +108,19 @@ private:
     std::size_t inlineCount_ = 0;
 };
 
-const char* ScalarKind(MetaObj::MetaType type) {
-    switch (type) {
-        case MetaObj::MetaTypeBool: return "bool";
-        case MetaObj::MetaTypeInt: return "int";
-        case MetaObj::MetaTypeString: return "string";
-        case MetaObj::MetaTypeStruct: return "struct";
-        case MetaObj::MetaTypeList: return "list";
-    }
-    return "string";
-}
+void WriteStructShape(JsonBuilder& json, const MetaStruct& shape);
 
-void WriteShape(JsonBuilder& json, const MetaObject& shape);
+// The "of" member of a list: its element structure, or {"kind": <scalar kind>}.
+void WriteListOf(JsonBuilder& json, const MetaList& list) {
+    json.Key("of");
+    if (list.GetTemplate()) {
+        WriteStructShape(json, *list.GetTemplate());
+        return;
+    }
+    json.BeginObject();
+    json.Member("kind", MetaKindName(list.GetElementType()));
+    json.EndObject();
+}
 
 void WriteStructShape(JsonBuilder& json, const MetaStruct& shape) {
     json.BeginObject();
@@ -131,23 +133,15 @@ void WriteStructShape(JsonBuilder& json, const MetaStruct& shape) {
         const MetaObject& value = *fields[i].second;
         json.BeginObject();
         json.Member("name", fields[i].first);
-        if (value.GetType() == MetaObj::MetaTypeList &&
-            static_cast<const MetaList&>(value).GetElementType() == MetaObj::MetaTypeString) {
+        if (value.GetType() != MetaObj::MetaTypeList) {
+            json.Member("kind", MetaKindName(value.GetType()));
+        } else if (static_cast<const MetaList&>(value).GetElementType() ==
+                   MetaObj::MetaTypeString) {
             json.Member("kind", "string-list");
-        } else if (value.GetType() == MetaObj::MetaTypeList) {
-            // Lists of structures or of other scalars: the list form, as for a whole result.
-            const MetaList& list = static_cast<const MetaList&>(value);
-            json.Member("kind", "list");
-            json.Key("of");
-            if (list.GetTemplate()) {
-                WriteStructShape(json, *list.GetTemplate());
-            } else {
-                json.BeginObject();
-                json.Member("kind", ScalarKind(list.GetElementType()));
-                json.EndObject();
-            }
         } else {
-            json.Member("kind", ScalarKind(value.GetType()));
+            // Lists of structures or of other scalars: the list form, as for a whole result.
+            json.Member("kind", "list");
+            WriteListOf(json, static_cast<const MetaList&>(value));
         }
         json.EndObject();
     }
@@ -161,17 +155,9 @@ void WriteShape(JsonBuilder& json, const MetaObject& shape) {
         return;
     }
     json.BeginObject();
-    json.Member("kind", ScalarKind(shape.GetType()));
+    json.Member("kind", MetaKindName(shape.GetType()));
     if (shape.GetType() == MetaObj::MetaTypeList) {
-        const MetaList& list = static_cast<const MetaList&>(shape);
-        json.Key("of");
-        if (list.GetTemplate()) {
-            WriteStructShape(json, *list.GetTemplate());
-        } else {
-            json.BeginObject();
-            json.Member("kind", ScalarKind(list.GetElementType()));
-            json.EndObject();
-        }
+        WriteListOf(json, static_cast<const MetaList&>(shape));
     }
     json.EndObject();
 }
@@ -247,12 +233,7 @@ void WriteNode(JsonBuilder& json, const boost::shared_ptr<AutoCli::NamespaceNode
                std::vector<std::string>& path) {
     json.BeginObject();
     json.Member("name", path.empty() ? std::string() : path.back());
-    std::string joined;
-    for (std::size_t i = 0; i < path.size(); ++i) {
-        if (i > 0) joined += ' ';
-        joined += path[i];
-    }
-    json.Member("path", joined);
+    json.Member("path", JoinWords(path));
     boost::shared_ptr<AutoCli::Command> command =
         node->IsCommand() ? boost::dynamic_pointer_cast<AutoCli::Command>(node)
                           : boost::shared_ptr<AutoCli::Command>();

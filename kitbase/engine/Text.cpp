@@ -347,6 +347,32 @@ std::vector<std::string> QuoteEach(const std::vector<std::string>& names) {
     return quoted;
 }
 
+std::string JoinWords(const std::vector<std::string>& words) {
+    std::string joined;
+    for (std::size_t i = 0; i < words.size(); ++i) {
+        if (i > 0) joined += ' ';
+        joined += words[i];
+    }
+    return joined;
+}
+
+const std::string* FindKey(const std::vector<KeyValue>& list, const std::string& key) {
+    for (std::size_t i = 0; i < list.size(); ++i) {
+        if (list[i].first == key) return &list[i].second;
+    }
+    return nullptr;
+}
+
+void SetKey(std::vector<KeyValue>& list, const std::string& key, const std::string& value) {
+    for (std::size_t i = 0; i < list.size(); ++i) {
+        if (list[i].first == key) {
+            list[i].second = value;
+            return;
+        }
+    }
+    list.push_back(KeyValue(key, value));
+}
+
 std::string JoinNames(const std::vector<std::string>& names, const char* last) {
     std::string joined;
     for (std::size_t i = 0; i < names.size(); ++i) {

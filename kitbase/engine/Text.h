@@ -11,6 +11,7 @@
 
 #include <cstddef>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace Kitbase {
@@ -71,6 +72,16 @@ KITBASE_API std::string Quote(const std::string& text);
 
 // Each name in single quotes, for listing names in a message.
 KITBASE_API std::vector<std::string> QuoteEach(const std::vector<std::string>& names);
+
+// The words joined by one blank: a command path as users type it.
+KITBASE_API std::string JoinWords(const std::vector<std::string>& words);
+
+// Ordered key/value lists (metadata, output parameters): the value of key, or null; and setting
+// a key, which replaces its value in place or adds it last.
+typedef std::pair<std::string, std::string> KeyValue;
+KITBASE_API const std::string* FindKey(const std::vector<KeyValue>& list, const std::string& key);
+KITBASE_API void SetKey(std::vector<KeyValue>& list, const std::string& key,
+                        const std::string& value);
 
 // "a", "a or b", "a, b or c" (with the given last separator, e.g. " or ").
 KITBASE_API std::string JoinNames(const std::vector<std::string>& names, const char* last);
