@@ -137,18 +137,11 @@ void PutJsonString(Writer& out, const char* text, std::size_t size) {
             out.Put(kReplacement, 3);
         } else {
             out.Put('\\');
-            switch (c) {
-                case '"': out.Put('"'); break;
-                case '\\': out.Put('\\'); break;
-                case '\b': out.Put('b'); break;
-                case '\f': out.Put('f'); break;
-                case '\n': out.Put('n'); break;
-                case '\r': out.Put('r'); break;
-                case '\t': out.Put('t'); break;
-                default: {
-                    char escape[5] = {'u', '0', '0', kHex[c >> 4], kHex[c & 15]};
-                    out.Put(escape, 5);
-                }
+            if (c == '"' || c == '\\') {
+                out.Put(static_cast<char>(c));
+            } else {
+                char escape[5] = {'u', '0', '0', kHex[c >> 4], kHex[c & 15]};
+                out.Put(escape, 5);
             }
         }
         ++i;

@@ -35,9 +35,9 @@ inline std::size_t DisplayWidth(const std::string& text) {
 // The byte offset just past the first `columns` code points of text (or size when shorter).
 KITBASE_API std::size_t OffsetOfColumn(const char* text, std::size_t size, std::size_t columns);
 
-// A JSON string literal (quotes included), escaped per RFC 8259: '"' and '\\' escaped, \b \f \n
-// \r \t in their short forms, other control characters as \u00XX, and every byte that is not
-// part of well-formed UTF-8 replaced by U+FFFD, so the output is always valid JSON.
+// A JSON string literal (quotes included), escaped per RFC 8259: '"' and '\\' as \" and \\, every
+// control character (newline and tab included) as \u00XX, and every byte that is not part of
+// well-formed UTF-8 replaced by U+FFFD, so the output is always valid JSON.
 KITBASE_API void PutJsonString(Writer& out, const char* text, std::size_t size);
 inline void PutJsonString(Writer& out, const std::string& text) {
     PutJsonString(out, text.data(), text.size());

@@ -92,7 +92,7 @@ TEST(Text, Utf8SequencesAreCheckedStrictly) {
 TEST(Text, JsonStringsAreEscapedAndAlwaysValid) {
     EXPECT_EQ("\"plain\"", Json("plain"));
     EXPECT_EQ("\"q\\\"b\\\\\"", Json("q\"b\\"));
-    EXPECT_EQ("\"\\n\\r\\t\\b\\f\\u0001\\u001f\"", Json("\n\r\t\b\f\x01\x1f"));
+    EXPECT_EQ("\"\\u000a\\u000d\\u0009\\u0008\\u000c\\u0001\\u001f\"", Json("\n\r\t\b\f\x01\x1f"));
     EXPECT_EQ("\"\xC3\xA9\"", Json("\xC3\xA9"));
     // Each byte that is not well-formed UTF-8 becomes U+FFFD; the rest is kept.
     EXPECT_EQ("\"a\xEF\xBF\xBD" "b\xEF\xBF\xBD(\"", Json("a\xFF" "b\xC3" "\x28"));
