@@ -327,6 +327,26 @@ TEST(Cli, BrokenPluginsAreReportedAndTheOthersStillServe) {
         QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS}).out.find("  half  Registered before"));
 }
 
+TEST(Cli, CommandsThatCannotDescribeThemselvesFailWithStatus1) {
+    const std::string expected =
+        "quarncli: internal error in 'half broken': no parameters today\n";
+    for (const std::vector<std::string>& words :
+         {std::vector<std::string>{"half", "broken"}, {"half", "broken", "--help"}}) {
+        std::vector<std::string> args = {"--plugin-dir", KB_MIXED_PLUGINS};
+        args.insert(args.end(), words.begin(), words.end());
+        Outcome outcome = QuarncliRaw(args);
+        EXPECT_EQ(1, outcome.status);
+        EXPECT_EQ("", outcome.out);
+        EXPECT_NE(std::string::npos, outcome.err.find(expected)) << outcome.err;
+    }
+    // The schema is all or nothing.
+    Outcome schema = QuarncliRaw({"--plugin-dir", KB_MIXED_PLUGINS, "--schema", "half"});
+    EXPECT_EQ(1, schema.status);
+    EXPECT_EQ("", schema.out);
+    EXPECT_NE(std::string::npos,
+              schema.err.find("quarncli: internal error in --schema: no parameters today\n"));
+}
+
 TEST(Cli, MissingPluginDirectoryIsOneLine) {
     Outcome outcome = QuarncliRaw({"--plugin-dir", "/nonexistent/plugins", "kb"});
     EXPECT_EQ(2, outcome.status);
