@@ -158,7 +158,8 @@ boost::shared_ptr<MetaList> MetaList::New(MetaType elementType,
         case MetaTypeInt:
         case MetaTypeString:
             if (structTemplate) {
-                throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(elementType) +
+                throw std::invalid_argument(std::string("MetaList of ") +
+                                            Engine::MetaKindName(elementType) +
                                             " given a structure template");
             }
             break;
@@ -175,8 +176,9 @@ MetaType MetaList::GetType() const { return MetaTypeList; }
 void MetaList::AddValue(const boost::shared_ptr<MetaObject>& value) {
     if (!value) throw std::invalid_argument("MetaList: null element");
     if (value->GetType() != element_type_) {
-        throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(element_type_) +
-                                    ": cannot add a " + Engine::MetaKindName(value->GetType()));
+        throw std::invalid_argument(std::string("MetaList of ") +
+                                    Engine::MetaKindName(element_type_) + ": cannot add a " +
+                                    Engine::MetaKindName(value->GetType()));
     }
     elements_.push_back(value);
 }
@@ -185,8 +187,8 @@ void MetaList::AddStruct(const boost::shared_ptr<MetaStruct>& value) { AddValue(
 
 void MetaList::AddString(const std::string& value) {
     if (element_type_ != MetaTypeString) {
-        throw std::invalid_argument(std::string("MetaList of ") + Engine::MetaKindName(element_type_) +
-                                    ": cannot add a string");
+        throw std::invalid_argument(std::string("MetaList of ") +
+                                    Engine::MetaKindName(element_type_) + ": cannot add a string");
     }
     elements_.push_back(MetaString::New(value));
 }

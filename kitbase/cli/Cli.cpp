@@ -247,7 +247,8 @@ private:
         std::vector<std::string> names;
         const std::vector<AutoCli::NamespaceNode::Child>& children = node.GetChildren();
         for (std::size_t i = 0; i < children.size(); ++i) names.push_back(children[i].first);
-        std::string where = path_.empty() ? std::string() : " under '" + Engine::JoinWords(path_) + "'";
+        std::string where =
+            path_.empty() ? std::string() : " under '" + Engine::JoinWords(path_) + "'";
         std::string message = "unknown command " + Quote(word) + where;
         if (names.empty()) {
             message += path_.empty() ? "; no plug-in has registered any command" : "; it is empty";
@@ -366,11 +367,7 @@ private:
             return Finish(kExitFailed);
         }
         if (help || parsed.status == Engine::ParseOutcome::kHelp) {
-            if (!GuardOrReport(where, [&] {
-                    Engine::WriteCommandHelp(out_, command, Usage(true), width);
-                })) {
-                return Finish(kExitFailed);
-            }
+            Engine::WriteCommandHelp(out_, command, *inputSpec, Usage(true), width);
             return Finish(kExitOk);
         }
         if (parsed.status == Engine::ParseOutcome::kError) {
@@ -404,8 +401,9 @@ private:
             request.width = width;
             Engine::Render(formatter, request, out_);
         }
+        // The result first, then the messages; a failed write of the result still lets them out.
         const std::vector<std::string>& errors = output->GetErrors();
-        if (!out_.Flush()) return Finish(kExitFailed);
+        out_.Flush();
         for (std::size_t i = 0; i < errors.size(); ++i) Message(errors[i]);
         if (!ran) Message(failure);
         if (!ran || !errors.empty()) status = kExitFailed;

@@ -130,9 +130,9 @@ std::string ParameterText(const CallSpec::ParameterSpec& parameter) {
 
 }  // namespace
 
-void WriteCommandHelp(Writer& out, AutoCli::Command& command, const std::string& usage,
+void WriteCommandHelp(Writer& out, const AutoCli::Command& command,
+                      const CallSpec::InputSpec& spec, const std::string& usage,
                       std::size_t width) {
-    boost::shared_ptr<CallSpec::InputSpec> spec = command.GetInputSpec();
     out.PutText("Usage: ");
     out.Put(usage);
     out.Put('\n');
@@ -141,7 +141,7 @@ void WriteCommandHelp(Writer& out, AutoCli::Command& command, const std::string&
         WriteParagraph(out, command.GetDescription(), width);
     }
     const std::vector<boost::shared_ptr<CallSpec::ParameterSpec> >& parameters =
-        spec->GetParameters();
+        spec.GetParameters();
     if (parameters.empty()) {
         out.PutText("\nThis command takes no options.\n");
         return;

@@ -4,12 +4,13 @@
 // with their descriptions, namespaces and commands apart, each group in attachment order. A
 // command's help shows usage, description and every parameter: long and short name, kind,
 // whether it is required, its help text and its constraints. Text wraps at the given width.
-// Building a command's help builds its InputSpec; an exception from that passes to the caller.
+// Nothing here throws but std::bad_alloc.
 #pragma once
 
 #include "engine/Writer.h"
 
 #include <kitbase/AutoCli.h>
+#include <kitbase/CallSpec.h>
 #include <kitbase/Export.h>
 
 #include <string>
@@ -32,8 +33,10 @@ KITBASE_API void WriteRows(Writer& out, const std::vector<HelpRow>& rows, std::s
 // usage: the whole "Usage: ..." line's text after "Usage: ".
 KITBASE_API void WriteNamespaceHelp(Writer& out, const AutoCli::NamespaceNode& node,
                                     const std::string& usage, std::size_t width);
-KITBASE_API void WriteCommandHelp(Writer& out, AutoCli::Command& command,
-                                  const std::string& usage, std::size_t width);
+// spec: the command's InputSpec, as the caller built it for parsing.
+KITBASE_API void WriteCommandHelp(Writer& out, const AutoCli::Command& command,
+                                  const CallSpec::InputSpec& spec, const std::string& usage,
+                                  std::size_t width);
 
 }  // namespace Engine
 }  // namespace Kitbase

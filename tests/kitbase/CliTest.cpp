@@ -364,6 +364,13 @@ TEST(Cli, VersionAndWriteFailures) {
     Outcome full = QuarncliRaw({"--plugin-dir", KB_GOOD_PLUGINS, "kb", "disks"}, {}, "/dev/full");
     EXPECT_EQ(1, full.status);
     EXPECT_EQ("quarncli: cannot write the output: No space left on device\n", full.err);
+    // The command's own messages still reach stderr, before the write failure.
+    Outcome partial =
+        QuarncliRaw({"--plugin-dir", KB_GOOD_PLUGINS, "kb", "partial"}, {}, "/dev/full");
+    EXPECT_EQ(1, partial.status);
+    EXPECT_EQ("Partly done: 1 of 2 items failed\n"
+              "quarncli: cannot write the output: No space left on device\n",
+              partial.err);
 }
 
 }  // namespace
