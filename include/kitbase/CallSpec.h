@@ -7,8 +7,10 @@
 // boost::shared_ptr.
 //
 // Misuse (an empty long name, a short name that is not one character, a range whose low bound
-// exceeds its high bound, a regular expression that does not compile) is a programming error and
-// throws std::invalid_argument when the specification is built.
+// exceeds its high bound) is a programming error and throws std::invalid_argument when the
+// specification is built. A regular expression is compiled only when a value must be checked
+// against it, so that start-up pays for no pattern it does not use; one that does not compile
+// throws std::invalid_argument then.
 #pragma once
 
 #include <kitbase/Export.h>
