@@ -1,78 +1,25 @@
 // quarncli and quarnhost as a user runs them: the identity commands through the plug-in and the
 // simulated host, faults set with quarnhost, and the refusals a user meets.
+#include "support/Files.h"
+#include "support/Process.h"
+
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include <fcntl.h>
-#include <spawn.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <algorithm>
-#include <cstdlib>
-#include <fstream>
-#include <sstream>
 #include <string>
 #include <vector>
-
-extern char** environ;
 
 namespace {
 
 using ordered_json = nlohmann::ordered_json;
-
-struct Result {
-    int status = -1;
-    std::string out;
-    std::string err;
-};
-
-std::string ReadFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::stringstream text;
-    text << in.rdbuf();
-    return text.str();
-}
-
-// A temporary directory, removed with everything in it.
-class TempDir {
-public:
-    TempDir() {
-        char pattern[] = "/tmp/quarn-e2e-XXXXXX";
-        path_ = mkdtemp(pattern);
-    }
-    ~TempDir() { std::system(("rm -rf '" + path_ + "'").c_str()); }
-    const std::string& path() const { return path_; }
-
-private:
-    std::string path_;
-};
-
-// Runs a program with the arguments; standard output and error are captured.
-Result RunProgram(const std::string& program, const std::vector<std::string>& args) {
-    TempDir io;
-    const std::string outPath = io.path() + "/out", errPath = io.path() + "/err";
-    posix_spawn_file_actions_t actions;
-    posix_spawn_file_actions_init(&actions);
-    posix_spawn_file_actions_addopen(&actions, 0, "/dev/null", O_RDONLY, 0);
-    posix_spawn_file_actions_addopen(&actions, 1, outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-    posix_spawn_file_actions_addopen(&actions, 2, errPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-    std::vector<char*> argv{const_cast<char*>(program.c_str())};
-    for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
-    argv.push_back(nullptr);
-    pid_t pid;
-    Result result;
-    if (posix_spawn(&pid, program.c_str(), &actions, nullptr, argv.data(), environ) == 0) {
-        int status = 0;
-        waitpid(pid, &status, 0);
-        result.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
-    }
-    posix_spawn_file_actions_destroy(&actions);
-    result.out = ReadFile(outPath);
-    result.err = ReadFile(errPath);
-    return result;
-}
+using Result = testsupport::ProcessResult;
+using testsupport::ReadFile;
+using testsupport::RunProgram;
+using testsupport::TempDir;
+using testsupport::WriteFile;
 
 class EndToEnd : public ::testing::Test {
 protected:
@@ -91,7 +38,7 @@ protected:
     ordered_json Identity() { return ordered_json::parse(ReadFile(DEFAULT_SCENARIO))["identity"]; }
 
     TempDir dir_;
-    const std::string state_ = dir_.path() + "/host";
+    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(EndToEnd, VersionOfTheDefaultHostInTemplateOrder) {
@@ -129,8 +76,8 @@ TEST_F(EndToEnd, UuidAndBootDeviceOfAnImportedHost) {
     scenario["identity"]["system_uuid"] = "00000000-1111-2222-3333-444444444444";
     scenario["identity"]["boot_nic_mac"] = "";
     scenario["identity"]["stateless_boot_nic_mac"] = "00:50:56:00:00:01";
-    const std::string file = dir_.path() + "/scenario.json";
-    std::ofstream(file) << scenario.dump(2);
+    const std::string file = dir_ / "scenario.json";
+    WriteFile(file, scenario.dump(2));
     ASSERT_EQ(Host({"init", "--scenario", file}).status, 0);
 
     Result r = Json({"system", "uuid", "get"});
@@ -182,7 +129,7 @@ TEST_F(EndToEnd, ConstructorFaultEscapingTheCommandIsReportedByTheFramework) {
 TEST_F(EndToEnd, UnusableStateDirectoryIsOneClearError) {
     // A state directory whose database is not a database.
     ASSERT_EQ(mkdir(state_.c_str(), 0700), 0);
-    std::ofstream(state_ + "/host.db") << "this is not a host database, nor any database at all.";
+    WriteFile(state_ + "/host.db", "this is not a host database, nor any database at all.");
     Result r = Json({"system", "version", "get"});
     EXPECT_EQ(r.status, 1);
     EXPECT_EQ(r.err.rfind("Unable to query product version: ", 0), 0u) << r.err;
@@ -241,7 +188,7 @@ TEST_F(EndToEnd, UsageErrorsExitTwoWithOneLine) {
 }
 
 TEST_F(EndToEnd, MissingPluginDirectoryIsRefused) {
-    const Result r = Cli({"--plugin-dir", dir_.path() + "/nowhere", "system", "version", "get"});
+    const Result r = Cli({"--plugin-dir", dir_ / "nowhere", "system", "version", "get"});
     EXPECT_NE(r.status, 0);
     EXPECT_NE(r.err.find("nowhere"), std::string::npos) << r.err;
     EXPECT_EQ(r.out, "");

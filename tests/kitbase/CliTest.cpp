@@ -1,84 +1,40 @@
 // quarncli as a process, against the test plug-ins: listings, help, suggestions, parsing, the
 // ways a command ends (exit statuses 0, 1 and 2 with their stdout and stderr), formatter choice,
 // global options and broken plug-ins.
+#include "support/Process.h"
+
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cstdlib>
-#include <fcntl.h>
-#include <fstream>
+#include <map>
+#include <optional>
 #include <sstream>
-#include <sys/wait.h>
-#include <unistd.h>
+#include <string>
+#include <vector>
 
 namespace {
 
-struct Outcome {
-    int status = -1;
-    std::string out;
-    std::string err;
-};
+using Outcome = testsupport::ProcessResult;
+// Variables set (or, with nullopt, removed) in quarncli's environment.
+using Environment = std::map<std::string, std::optional<std::string>>;
 
-std::string ReadFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::stringstream text;
-    text << in.rdbuf();
-    return text.str();
-}
-
-std::string TempPath(const char* stem) {
-    const char* dir = std::getenv("TMPDIR");
-    return std::string(dir ? dir : "/tmp") + "/kbcli-" + stem + "-" + std::to_string(getpid());
-}
-
-// Runs quarncli with args (no plug-in directory added) and extra environment settings
-// ("NAME=value", or "NAME" to remove one); stdout goes to outPath when given.
-Outcome QuarncliRaw(const std::vector<std::string>& args, const std::vector<std::string>& env = {},
-               const std::string& outPath = "") {
-    Outcome outcome;
+// Runs quarncli with args (no plug-in directory added) and extra environment settings, at 80
+// columns unless env sets COLUMNS; stdout goes to outPath when given.
+Outcome QuarncliRaw(const std::vector<std::string>& args, Environment env = {},
+                    const std::optional<std::string>& outPath = std::nullopt) {
     const char* program = std::getenv("QUARNCLI");
     if (program == nullptr) {
         ADD_FAILURE() << "QUARNCLI is not set (ctest sets it to the built quarncli)";
-        return outcome;
+        return Outcome();
     }
-    std::string outFile = outPath.empty() ? TempPath("out") : outPath;
-    std::string errFile = TempPath("err");
-    pid_t pid = fork();
-    if (pid == 0) {
-        int out = open(outFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-        int err = open(errFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-        if (out < 0 || err < 0) _exit(127);
-        dup2(out, 1);
-        dup2(err, 2);
-        setenv("COLUMNS", "80", 1);
-        for (const std::string& setting : env) {
-            std::string::size_type eq = setting.find('=');
-            if (eq == std::string::npos) {
-                unsetenv(setting.c_str());
-            } else {
-                setenv(setting.substr(0, eq).c_str(), setting.substr(eq + 1).c_str(), 1);
-            }
-        }
-        std::vector<char*> argv;
-        argv.push_back(const_cast<char*>(program));
-        for (const std::string& arg : args) argv.push_back(const_cast<char*>(arg.c_str()));
-        argv.push_back(nullptr);
-        execv(program, argv.data());
-        _exit(127);
-    }
-    int status = 0;
-    waitpid(pid, &status, 0);
-    outcome.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
-    if (outPath.empty()) outcome.out = ReadFile(outFile);
-    outcome.err = ReadFile(errFile);
-    if (outPath.empty()) unlink(outFile.c_str());
-    unlink(errFile.c_str());
-    return outcome;
+    env.emplace("COLUMNS", "80");
+    return testsupport::RunProgram(program, args, env, outPath);
 }
 
 // quarncli --plugin-dir <the good test plug-ins> args...
-Outcome Quarncli(const std::vector<std::string>& args, const std::vector<std::string>& env = {}) {
+Outcome Quarncli(const std::vector<std::string>& args, const Environment& env = {}) {
     std::vector<std::string> all = {"--plugin-dir", KB_GOOD_PLUGINS};
     all.insert(all.end(), args.begin(), args.end());
     return QuarncliRaw(all, env);
@@ -258,7 +214,8 @@ TEST(Cli, FormatterAndFormatParamsSteerTheOutput) {
     Outcome steered = Quarncli({"--format-param", "table-columns=Name,Mounted", "--format-param",
                            "show-header:Disk=false", "kb", "disks"});
     EXPECT_EQ("root     true\nscratch  false\n", steered.out);
-    Outcome wrapped = Quarncli({"--format-param=wrap-last=true", "kb", "disks"}, {"COLUMNS=40"});
+    Outcome wrapped =
+        Quarncli({"--format-param=wrap-last=true", "kb", "disks"}, {{"COLUMNS", "40"}});
     EXPECT_EQ("Name     Size (B)  Note\n"
               "-------  --------  ---------------------\n"
               "root     4096      boot volume\n"
@@ -279,9 +236,10 @@ TEST(Cli, FormatterAndFormatParamsSteerTheOutput) {
 TEST(Cli, HostStateIsHandedToPluginsThroughTheEnvironment) {
     EXPECT_EQ("/some/host dir\n",
               Quarncli({"--host-state", "/some/host dir", "kb", "hoststate"}).out);
-    EXPECT_EQ("/from/env\n", Quarncli({"kb", "hoststate"}, {"QUARN_HOST_STATE=/from/env"}).out);
+    EXPECT_EQ("/from/env\n",
+              Quarncli({"kb", "hoststate"}, {{"QUARN_HOST_STATE", "/from/env"}}).out);
     EXPECT_EQ("/option/wins\n", Quarncli({"--host-state=/option/wins", "kb", "hoststate"},
-                                    {"QUARN_HOST_STATE=/from/env"})
+                                    {{"QUARN_HOST_STATE", "/from/env"}})
                                     .out);
 }
 

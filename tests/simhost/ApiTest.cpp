@@ -48,7 +48,7 @@ TEST_F(ApiTest, SystemInfoReturnsTheStoredIdentity) {
     EXPECT_EQ(info.GetBootFsUUID(), "6523a1f4-5e2d9b70-7c41-0050569a2b3c");
     EXPECT_EQ(info.GetStatelessBootNicMacAddress(), "");
 
-    host_.host().Init(simtest::ReadFile(simtest::ScenarioFile("no-netboot.json")), true);
+    host_.host().Init(testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")), true);
     EXPECT_EQ(info.GetSystemUuid(), "4c4c4544-0042-3510-8057-b7c04f4e3232");
     EXPECT_EQ(info.GetBootNicMacAddress(), "");
     EXPECT_EQ(info.GetBootFsUUID(), "");

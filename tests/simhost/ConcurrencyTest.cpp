@@ -55,7 +55,7 @@ struct Race {
 
 std::vector<int> StartChildren(int count, int (*body)(void*), Race& race) {
     std::vector<int> pids;
-    for (int i = 0; i < count; ++i) pids.push_back(simtest::ForkChild(body, &race));
+    for (int i = 0; i < count; ++i) pids.push_back(testsupport::ForkChild(body, &race));
     race.line->Release();
     return pids;
 }
@@ -66,8 +66,8 @@ protected:
 };
 
 TEST_F(ConcurrencyTest, ConcurrentFirstUseCreatesOneWholeHost) {
-    simtest::TempDir dir;
-    simtest::EnvOverride env("QUARN_HOST_STATE", dir / "fresh");
+    testsupport::TempDir dir;
+    testsupport::EnvOverride env("QUARN_HOST_STATE", dir / "fresh");
     StartingLine line;
     Race race{&line, 1};
     auto pids = StartChildren(
@@ -78,7 +78,7 @@ TEST_F(ConcurrencyTest, ConcurrentFirstUseCreatesOneWholeHost) {
             return info.GetSystemUuid() == "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c" ? 0 : 1;
         },
         race);
-    for (int pid : pids) EXPECT_EQ(simtest::WaitChild(pid), 0);
+    for (int pid : pids) EXPECT_EQ(testsupport::WaitChild(pid), 0);
     std::set<std::string> files;
     for (const auto& entry : std::filesystem::directory_iterator(dir / "fresh"))
         files.insert(entry.path().filename().string());
@@ -112,7 +112,7 @@ TEST_F(ConcurrencyTest, CountedFaultFiresExactlyNTimesAcrossProcesses) {
         race);
     int failures = 0;
     for (int pid : pids) {
-        int status = simtest::WaitChild(pid);
+        int status = testsupport::WaitChild(pid);
         ASSERT_LT(status, 100);
         failures += status;
     }
@@ -141,7 +141,7 @@ TEST_F(ConcurrencyTest, ConcurrentWritersLoseNoUpdate) {
             return 0;
         },
         race);
-    for (int pid : pids) EXPECT_EQ(simtest::WaitChild(pid), 0);
+    for (int pid : pids) EXPECT_EQ(testsupport::WaitChild(pid), 0);
     auto journal = host.host().Journal();
     ASSERT_EQ(journal.size(), 100u);
     for (std::size_t i = 1; i < journal.size(); ++i)
@@ -151,10 +151,10 @@ TEST_F(ConcurrencyTest, ConcurrentWritersLoseNoUpdate) {
 }
 
 TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
-    simtest::TempDir dir;
+    testsupport::TempDir dir;
     simhost::Host host(dir / "h");
     std::string first = simhost::DefaultScenario();
-    std::string second = simtest::ReadFile(simtest::ScenarioFile("stateless.json"));
+    std::string second = testsupport::ReadFile(simtest::ScenarioFile("stateless.json"));
     host.Init(first);
     struct Context {
         StartingLine line;
@@ -165,7 +165,7 @@ TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
     context.second = second;
     std::vector<int> pids;
     for (int i = 0; i < 2; ++i)
-        pids.push_back(simtest::ForkChild(
+        pids.push_back(testsupport::ForkChild(
             [](void* raw) {
                 Context* context = static_cast<Context*>(raw);
                 context->line.Wait();
@@ -180,7 +180,7 @@ TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
     for (int round = 0; round < 15; ++round)
         simtest::RunQuarnhost({"--state", host.Dir(), "init", "--force", "--scenario",
                                simtest::ScenarioFile(round % 2 ? "default.json" : "stateless.json")});
-    for (int pid : pids) EXPECT_EQ(simtest::WaitChild(pid), 0);
+    for (int pid : pids) EXPECT_EQ(testsupport::WaitChild(pid), 0);
 }
 
 TEST_F(ConcurrencyTest, ThreadsShareTheProcessConnectionSafely) {

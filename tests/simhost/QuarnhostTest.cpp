@@ -13,7 +13,7 @@
 
 namespace {
 
-using simtest::ProcessResult;
+using testsupport::ProcessResult;
 using simtest::RunQuarnhost;
 
 const std::string kGetUuid = "NorlithCtl::System::SystemInfoImpl::GetSystemUuid";
@@ -42,7 +42,7 @@ protected:
     }
     void TearDown() override { simhost::CloseHost(); }
 
-    simtest::TempDir dir_;
+    testsupport::TempDir dir_;
     std::string state_ = dir_ / "host";
 };
 
@@ -59,10 +59,10 @@ TEST_F(QuarnhostTest, InitCreatesRefusesAndReplaces) {
     ProcessResult created = Run({"init", "--scenario", simtest::ScenarioFile("no-netboot.json")});
     EXPECT_EQ(created.status, 0) << created.err;
     EXPECT_NE(created.out.find("Created"), std::string::npos);
-    EXPECT_EQ(Export(), simtest::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    EXPECT_EQ(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
 
     ExpectRefusal({"init"}, 1, "already exists at '" + state_ + "'; use --force");
-    EXPECT_EQ(Export(), simtest::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    EXPECT_EQ(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
 
     ProcessResult replaced = Run({"init", "--force"});
     EXPECT_EQ(replaced.status, 0) << replaced.err;
@@ -74,10 +74,10 @@ TEST_F(QuarnhostTest, ABadScenarioFileIsRefusedWithItsLocation) {
     ASSERT_EQ(Run({"init", "--scenario", simtest::ScenarioFile("stateless.json")}).status, 0);
     std::string before = Export();
     std::string bad = dir_ / "bad.json";
-    simtest::WriteFile(bad, simtest::EditedDefault("/identity/product", std::string(40, 'q')));
+    testsupport::WriteFile(bad, simtest::EditedDefault("/identity/product", std::string(40, 'q')));
     ExpectRefusal({"init", "--force", "--scenario", bad}, 1,
                   bad + ": scenario: identity.product: expected a string of at most 31 bytes");
-    simtest::WriteFile(bad, "{\"format\": 1,");
+    testsupport::WriteFile(bad, "{\"format\": 1,");
     ExpectRefusal({"init", "--force", "--scenario", bad}, 1, "scenario: not valid JSON");
     ExpectRefusal({"init", "--force", "--scenario", dir_ / "missing.json"}, 1, "cannot read");
     EXPECT_EQ(Export(), before);
@@ -112,7 +112,7 @@ TEST_F(QuarnhostTest, JournalPrintsOneLinePerEntryAndClears) {
     Run({"init"});
     Run({"fault", "add", "QuillUserLib_AddQuill", "full", "--times", "1"});
     {
-        simtest::EnvOverride env("QUARN_HOST_STATE", state_);
+        testsupport::EnvOverride env("QUARN_HOST_STATE", state_);
         ASSERT_EQ(QuillUserLib_Init(), 0);
         EXPECT_EQ(QuillUserLib_AddQuill("first"), -1);
         EXPECT_EQ(QuillUserLib_AddQuill("second one"), 0);
@@ -162,23 +162,23 @@ TEST_F(QuarnhostTest, UsageErrorsExitWithTwo) {
 }
 
 TEST_F(QuarnhostTest, UnusableStateIsAFailureThatChangesNothing) {
-    simtest::WriteFile(dir_ / "plain", "x");
+    testsupport::WriteFile(dir_ / "plain", "x");
     state_ = dir_ / "plain/host";
     ExpectRefusal({"export"}, 1, "Cannot open the simulated host at '" + state_ + "'");
     ExpectRefusal({"init"}, 1, "Cannot open the simulated host at '" + state_ + "'");
 
     state_ = dir_ / "corrupt";
     std::filesystem::create_directories(state_);
-    simtest::WriteFile(state_ + "/host.db", std::string(4096, 'z'));
+    testsupport::WriteFile(state_ + "/host.db", std::string(4096, 'z'));
     for (auto args : std::vector<std::vector<std::string>>{
              {"export"}, {"journal"}, {"fault", "list"}, {"fault", "add", kGetUuid, "m"},
              {"init", "--force"}})
         ExpectRefusal(args, 1, "Cannot open the simulated host at '" + state_ + "'");
-    EXPECT_EQ(simtest::ReadFile(state_ + "/host.db"), std::string(4096, 'z'));
+    EXPECT_EQ(testsupport::ReadFile(state_ + "/host.db"), std::string(4096, 'z'));
 }
 
 TEST_F(QuarnhostTest, FindsItsHostLikeQuarncli) {
-    simtest::TempDir home;
+    testsupport::TempDir home;
     auto from_env = RunQuarnhost({"init"}, {{"QUARN_HOST_STATE", state_}});
     EXPECT_EQ(from_env.status, 0) << from_env.err;
     EXPECT_TRUE(simhost::Host(state_).Exists());

@@ -96,9 +96,10 @@ TEST_F(SysinfoTest, GetEncodesTheHostsCurrentIdentity) {
     EXPECT_EQ(record[311], 0);
     EXPECT_EQ(record[100], 0);  // the 0xAA fill is overwritten everywhere
 
-    host_.host().Init(simtest::ReadFile(simtest::ScenarioFile("limits.json")), true);
+    host_.host().Init(testsupport::ReadFile(simtest::ScenarioFile("limits.json")), true);
     host_.host().ClearFaults();  // the scenario also sets one on Get
-    auto limits = nlohmann::json::parse(simtest::ReadFile(simtest::ScenarioFile("limits.json")));
+    auto limits =
+        nlohmann::json::parse(testsupport::ReadFile(simtest::ScenarioFile("limits.json")));
     node.Get(record, sizeof record);
     EXPECT_EQ(TextAt(record, 0), limits["identity"]["product"]);
     EXPECT_EQ(TextAt(record, 32), limits["identity"]["version"]);

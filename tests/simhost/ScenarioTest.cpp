@@ -20,11 +20,12 @@ std::string RejectionOf(const std::string& text) {
 }
 
 TEST(ScenarioRoundTrip, EachShippedScenarioExportsAsItsOwnText) {
-    EXPECT_EQ(simhost::DefaultScenario(), simtest::ReadFile(simtest::ScenarioFile("default.json")));
+    EXPECT_EQ(simhost::DefaultScenario(),
+              testsupport::ReadFile(simtest::ScenarioFile("default.json")));
     for (const char* name :
          {"default.json", "no-netboot.json", "stateless.json", "limits.json", "faults.json"}) {
         SCOPED_TRACE(name);
-        std::string text = simtest::ReadFile(simtest::ScenarioFile(name));
+        std::string text = testsupport::ReadFile(simtest::ScenarioFile(name));
         simhost::TempHost host(text);
         std::string exported = host.host().Export();
         EXPECT_EQ(exported, text);
@@ -122,7 +123,7 @@ TEST(ScenarioValidation, ReportsTheFirstProblemWithItsLocation) {
 }
 
 TEST(ScenarioValidation, ARefusedScenarioLeavesTheHostExactlyAsItWas) {
-    simhost::TempHost host(simtest::ReadFile(simtest::ScenarioFile("stateless.json")));
+    simhost::TempHost host(testsupport::ReadFile(simtest::ScenarioFile("stateless.json")));
     host.host().AddFault("QuillUserLib_Init", "kept", 2);
     std::string before = host.host().Export();
     std::string bad = EditedDefault("/identity/update", std::string(152, 'u'));
@@ -130,7 +131,7 @@ TEST(ScenarioValidation, ARefusedScenarioLeavesTheHostExactlyAsItWas) {
     EXPECT_THROW(host.host().Init("not json", true), simhost::ScenarioError);
     EXPECT_EQ(host.host().Export(), before);
 
-    simtest::TempDir dir;
+    testsupport::TempDir dir;
     simhost::Host absent(dir / "never");
     EXPECT_THROW(absent.Init(bad), simhost::ScenarioError);
     EXPECT_FALSE(absent.Exists());

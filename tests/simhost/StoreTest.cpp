@@ -19,8 +19,8 @@
 
 namespace {
 
-using simtest::EnvOverride;
-using simtest::TempDir;
+using testsupport::EnvOverride;
+using testsupport::TempDir;
 
 std::string UuidOf(const std::string& state) {
     EnvOverride env("QUARN_HOST_STATE", state);
@@ -83,7 +83,7 @@ TEST_F(StoreTest, FirstUseAtTheDefaultLocationCreatesTheDefaultHost) {
 TEST_F(StoreTest, NextOperationFollowsQuarnHostStateToAnotherHost) {
     TempDir dir;
     simhost::Host(dir / "a").Init();
-    simhost::Host(dir / "b").Init(simtest::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    simhost::Host(dir / "b").Init(testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
     EXPECT_EQ(UuidOf(dir / "a"), "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c");
     EXPECT_EQ(UuidOf(dir / "b"), "4c4c4544-0042-3510-8057-b7c04f4e3232");
     EXPECT_EQ(UuidOf(dir / "a"), "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c");
@@ -100,12 +100,12 @@ TEST_F(StoreTest, ChangesPersistAcrossConnections) {
 
 TEST_F(StoreTest, UnusableStateDirectoriesAreRefusedWithoutCreatingAnything) {
     TempDir dir;
-    simtest::WriteFile(dir / "file", "x");
+    testsupport::WriteFile(dir / "file", "x");
     std::string under_file = dir / "file/host";
     std::string message = ThrownBy([&] { UuidOf(under_file); });
     EXPECT_EQ(message.rfind("Cannot open the simulated host at '" + under_file + "': ", 0), 0u)
         << message;
-    EXPECT_EQ(simtest::ReadFile(dir / "file"), "x");
+    EXPECT_EQ(testsupport::ReadFile(dir / "file"), "x");
 
     // The database path taken by a directory.
     std::filesystem::create_directories(dir / "taken/host.db");
@@ -118,14 +118,14 @@ TEST_F(StoreTest, CorruptOrForeignDatabasesAreRefusedAndLeftAlone) {
     TempDir dir;
     std::filesystem::create_directories(dir / "corrupt");
     std::string garbage(8192, '\x5a');
-    simtest::WriteFile(dir / "corrupt/host.db", garbage);
+    testsupport::WriteFile(dir / "corrupt/host.db", garbage);
     std::string message = ThrownBy([&] { UuidOf(dir / "corrupt"); });
     EXPECT_EQ(message.rfind("Cannot open the simulated host at '" + dir / "corrupt" + "': ", 0), 0u);
     EXPECT_NE(message.find("not a database"), std::string::npos) << message;
-    EXPECT_EQ(simtest::ReadFile(dir / "corrupt/host.db"), garbage);
+    EXPECT_EQ(testsupport::ReadFile(dir / "corrupt/host.db"), garbage);
     EXPECT_THROW(simhost::Host(dir / "corrupt").Init(simhost::DefaultScenario(), true),
                  simhost::HostError);
-    EXPECT_EQ(simtest::ReadFile(dir / "corrupt/host.db"), garbage);
+    EXPECT_EQ(testsupport::ReadFile(dir / "corrupt/host.db"), garbage);
 
     std::filesystem::create_directories(dir / "foreign");
     {
@@ -159,7 +159,7 @@ TEST_F(StoreTest, AProcessKilledInsideAWriteLeavesTheLastCommittedState) {
     simhost::TempHost host;
     std::string before = host.host().Export();
     std::string path = simhost::DatabasePath(host.Dir());
-    int pid = simtest::ForkChild(
+    int pid = testsupport::ForkChild(
         [](void* context) {
             simhost::Db db(*static_cast<std::string*>(context));
             db.Exec("BEGIN IMMEDIATE; DELETE FROM identity;"
@@ -168,7 +168,7 @@ TEST_F(StoreTest, AProcessKilledInsideAWriteLeavesTheLastCommittedState) {
             return 0;
         },
         &path);
-    EXPECT_EQ(simtest::WaitChild(pid), 128 + SIGKILL);
+    EXPECT_EQ(testsupport::WaitChild(pid), 128 + SIGKILL);
     simhost::CloseHost();
     EXPECT_EQ(host.host().Export(), before);
     ASSERT_EQ(QuillUserLib_Init(), 0);
@@ -180,7 +180,7 @@ TEST_F(StoreTest, InitRefusesAnExistingHostUnlessReplacing) {
     TempDir dir;
     simhost::Host host(dir / "h");
     EXPECT_FALSE(host.Exists());
-    host.Init(simtest::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    host.Init(testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
     EXPECT_TRUE(host.Exists());
     EXPECT_THROW(host.Init(), simhost::HostExists);
     EXPECT_EQ(UuidOf(host.Dir()), "4c4c4544-0042-3510-8057-b7c04f4e3232");
@@ -195,7 +195,7 @@ TEST_F(StoreTest, TempHostPointsTheEnvironmentAtAFreshHostAndCleansUp) {
     EnvOverride state("QUARN_HOST_STATE", "/nonexistent/elsewhere");
     std::string dir;
     {
-        simhost::TempHost host(simtest::ReadFile(simtest::ScenarioFile("stateless.json")));
+        simhost::TempHost host(testsupport::ReadFile(simtest::ScenarioFile("stateless.json")));
         dir = host.Dir();
         EXPECT_EQ(simhost::StateDirFromEnvironment(), dir);
         EXPECT_EQ(NorlithCtl::System::SystemInfoImpl().GetStatelessBootNicMacAddress(),
