@@ -1,6 +1,6 @@
 // libFuzzer target over the command-option parser.
 //
-// The first byte picks one of a few input specifications (every kind with range and regex
+// The first byte picks one of a few parameter lists (every kind with range and regex
 // constraints and required parameters; one that claims -h; one without parameters); the rest,
 // split at NUL bytes, is the argument list. Whatever the words, the parser must answer with
 // exactly one outcome: accepted (every given parameter readable), help, or a single-line

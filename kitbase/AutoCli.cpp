@@ -88,8 +88,8 @@ Namespace::~Namespace() {}
 
 Command::~Command() {}
 
-// A command that hands back no specification is treated as one without parameters, and one
-// without an output specification as one whose result has no template.
+// A command that hands back no parameter list is treated as one without parameters, and one
+// without a result shape as one whose result has no template.
 boost::shared_ptr<CallSpec::InputSpec> Command::GetInputSpec() {
     boost::shared_ptr<CallSpec::InputSpec> spec = GetInputSpecInternal();
     return spec ? spec : CallSpec::InputSpec::New();

@@ -1,4 +1,4 @@
-// Call specifications, and the input and output of one execution.
+// Declared parameters and result shapes, and the input and output of one execution.
 #include <kitbase/CallSpec.h>
 
 #include "engine/Text.h"
@@ -84,7 +84,7 @@ void ParameterSpec::AddConstraint(const boost::shared_ptr<ParameterConstraint>& 
 
 void ParameterSpec::SetRequired(bool required) { required_ = required; }
 
-// ---- input specification ----
+// ---- declared parameters ----
 
 boost::shared_ptr<InputSpec> InputSpec::New() {
     return boost::shared_ptr<InputSpec>(new InputSpec());
@@ -119,7 +119,7 @@ boost::shared_ptr<ParameterSpec> InputSpec::FindShort(const std::string& letter)
     return boost::shared_ptr<ParameterSpec>();
 }
 
-// ---- output specification ----
+// ---- result shape ----
 
 boost::shared_ptr<OutputSpec> OutputSpec::New() {
     return boost::shared_ptr<OutputSpec>(new OutputSpec());

@@ -15,7 +15,7 @@ const std::string kPrefix = "NorlithCtl::Util::Sysinfo::";
 std::string NodeName(int node) { return "kernel information node " + std::to_string(node); }
 
 // The node's description; the constructor has checked that it exists.
-const simhost::SysinfoNode& NodeSpec(int node) {
+const simhost::SysinfoNode& KnownNode(int node) {
     const simhost::SysinfoNode* found = simhost::FindSysinfoNode(node);
     if (!found) throw simhost::HostError("unknown " + NodeName(node));
     return *found;
@@ -30,7 +30,7 @@ nlohmann::ordered_json PathJson(const std::vector<std::string>& path) {
 Sysinfo::Sysinfo(int node) : node_(node) {
     norlithctl::HostCall([&] {
         simhost::Call call(kPrefix + "Sysinfo", simhost::Args().Add("node", node));
-        NodeSpec(node);
+        KnownNode(node);
     });
 }
 
@@ -42,7 +42,7 @@ void Sysinfo::Get(void* buffer, std::size_t size) {
                                                 .Add("node", node_)
                                                 .Add("instance", PathJson(instance_path_))
                                                 .Add("size", size));
-        const simhost::SysinfoNode& node = NodeSpec(node_);
+        const simhost::SysinfoNode& node = KnownNode(node_);
         if (size != node.record_size)
             throw simhost::HostError("Cannot read " + NodeName(node_) + ": the buffer has " +
                                      std::to_string(size) + " bytes, the record has " +
@@ -58,7 +58,7 @@ void Sysinfo::List(std::vector<std::string>& names) {
         simhost::Call call(kPrefix + "List", simhost::Args()
                                                  .Add("node", node_)
                                                  .Add("instance", PathJson(instance_path_)));
-        const simhost::SysinfoNode& node = NodeSpec(node_);
+        const simhost::SysinfoNode& node = KnownNode(node_);
         if (!node.list) throw simhost::HostError(NodeName(node_) + " has no instances");
         for (std::string& name : node.list(call.db())) names.push_back(std::move(name));
     });
@@ -68,7 +68,7 @@ void Sysinfo::AddInstancePath(const std::string& path) {
     norlithctl::HostCall([&] {
         simhost::Call call(kPrefix + "AddInstancePath",
                            simhost::Args().Add("node", node_).Add("path", path));
-        if (!NodeSpec(node_).list) throw simhost::HostError(NodeName(node_) + " has no instances");
+        if (!KnownNode(node_).list) throw simhost::HostError(NodeName(node_) + " has no instances");
         instance_path_.push_back(path);
     });
 }

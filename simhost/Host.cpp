@@ -40,15 +40,25 @@ std::string Host::Export() {
     return ScenarioText(scenario);
 }
 
+namespace {
+
+// Runs change(db) on the host in dir in one write transaction.
+template <class Change>
+void WriteHost(const std::string& dir, Change change) {
+    Session session = Session::Open(dir);
+    WriteTxn txn(session.db());
+    change(session.db());
+    txn.Commit();
+}
+
+}  // namespace
+
 void Host::AddFault(const std::string& operation, const std::string& message,
                     std::optional<std::int64_t> times) {
     Fault fault{operation, message, times};
     std::string problem = CheckFault(fault);
     if (!problem.empty()) throw HostError(problem);
-    Session session = Session::Open(dir_);
-    WriteTxn txn(session.db());
-    StoreFault(session.db(), fault);
-    txn.Commit();
+    WriteHost(dir_, [&](Db& db) { StoreFault(db, fault); });
 }
 
 std::vector<Fault> Host::Faults() {
@@ -56,24 +66,14 @@ std::vector<Fault> Host::Faults() {
     return ReadFaults(session.db());
 }
 
-void Host::ClearFaults() {
-    Session session = Session::Open(dir_);
-    WriteTxn txn(session.db());
-    DeleteFaults(session.db());
-    txn.Commit();
-}
+void Host::ClearFaults() { WriteHost(dir_, DeleteFaults); }
 
 std::vector<JournalEntry> Host::Journal() {
     Session session = Session::Open(dir_);
     return ReadJournal(session.db());
 }
 
-void Host::ClearJournal() {
-    Session session = Session::Open(dir_);
-    WriteTxn txn(session.db());
-    DeleteJournal(session.db());
-    txn.Commit();
-}
+void Host::ClearJournal() { WriteHost(dir_, DeleteJournal); }
 
 namespace {
 

@@ -1,4 +1,4 @@
-// Call specifications: what a command accepts and what it returns, and the values of one call.
+// Call descriptions: what a command accepts and what it returns, and the values of one call.
 //
 // A command describes its parameters with an InputSpec of ParameterSpecs (each optionally
 // constrained) and its result's shape with an OutputSpec holding a meta-object template. For one
@@ -8,7 +8,7 @@
 //
 // Misuse (an empty long name, a short name that is not one character, a range whose low bound
 // exceeds its high bound) is a programming error and throws std::invalid_argument when the
-// specification is built. A regular expression is compiled only when a value must be checked
+// parameter is declared. A regular expression is compiled only when a value must be checked
 // against it, so that start-up pays for no pattern it does not use; one that does not compile
 // throws std::invalid_argument then.
 #pragma once

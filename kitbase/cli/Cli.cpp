@@ -356,7 +356,6 @@ private:
 
     int Command(AutoCli::Command& command, const std::vector<std::string>& rest) {
         const std::string where = "'" + Engine::JoinWords(path_) + "'";
-        std::size_t width = Engine::TerminalWidth(outFd_);
         bool help = options_.help;
         boost::shared_ptr<CallSpec::InputSpec> inputSpec;
         Engine::ParseOutcome parsed;
@@ -367,7 +366,8 @@ private:
             return Finish(kExitFailed);
         }
         if (help || parsed.status == Engine::ParseOutcome::kHelp) {
-            Engine::WriteCommandHelp(out_, command, *inputSpec, Usage(true), width);
+            Engine::WriteCommandHelp(out_, command, *inputSpec, Usage(true),
+                                     Engine::TerminalWidth(outFd_));
             return Finish(kExitOk);
         }
         if (parsed.status == Engine::ParseOutcome::kError) {
@@ -398,7 +398,7 @@ private:
             request.result = output->GetResult().get();
             request.resultTemplate = outputSpec ? outputSpec->GetResultTemplate().get() : nullptr;
             request.params = &params;
-            request.width = width;
+            request.width = Engine::TerminalWidth(outFd_);
             Engine::Render(formatter, request, out_);
         }
         // The result first, then the messages; a failed write of the result still lets them out.

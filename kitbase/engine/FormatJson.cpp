@@ -60,56 +60,74 @@ private:
     std::deque<std::vector<std::size_t> > extras_;
 };
 
-// ---- json ----
-
-std::string JsonKey(const std::string& name) {
-    std::string key;
-    {
-        Writer writer(&key, 256);
-        PutJsonString(writer, name);
-        writer.Put(": ", 2);
-    }
-    return key;
-}
-
-class JsonFormatter {
+// The walk json and xml share: a structure maps its fields onto the columns of its kind, a list
+// takes the template of its elements, and everything else is a scalar (or nothing). Derived
+// says how each is written: Scalar(value), List(list, template, depth), Struct(row, template,
+// layout, cells, extras, depth), and Key(name), the column heading written out once per layout.
+template <class Derived>
+class TreeWriter {
 public:
-    explicit JsonFormatter(Writer& out) : out_(out) {}
+    explicit TreeWriter(Writer& out) : out_(out) {}
 
     void Value(const MetaObject* value, const MetaObject* tmpl, std::size_t depth) {
-        if (value == nullptr || !value->HasValue()) {
-            out_.Put("null", 4);
-            return;
-        }
-        switch (value->GetType()) {
-            case MetaObj::MetaTypeString:
-                PutJsonString(out_, static_cast<const MetaString*>(value)->GetValue());
-                return;
-            case MetaObj::MetaTypeInt:
-                out_.PutInt(static_cast<const MetaInt*>(value)->GetValue());
-                return;
-            case MetaObj::MetaTypeBool:
-                if (static_cast<const MetaBool*>(value)->GetValue()) {
-                    out_.Put("true", 4);
-                } else {
-                    out_.Put("false", 5);
-                }
-                return;
-            case MetaObj::MetaTypeStruct: {
-                const MetaStruct& row = AsStruct(*value);
-                Struct(row, TemplateFor(tmpl, row.GetName()), depth);
-                return;
-            }
-            case MetaObj::MetaTypeList:
-                List(AsList(*value), tmpl, depth);
-                return;
+        if (value != nullptr && value->GetType() == MetaObj::MetaTypeStruct) {
+            const MetaStruct& row = AsStruct(*value);
+            const MetaStruct* rowTemplate = TemplateFor(tmpl, row.GetName());
+            Layout& layout = cache_.For(row, rowTemplate, Derived::Key);
+            layout.columns.Map(row);
+            std::vector<const MetaObject*>& cells = cache_.CellsAt(depth);
+            std::vector<std::size_t>& extras = cache_.ExtrasAt(depth);
+            cells = layout.columns.Cells();
+            extras = layout.columns.Extras();
+            Self().Struct(row, rowTemplate, layout, cells, extras, depth);
+        } else if (value != nullptr && value->GetType() == MetaObj::MetaTypeList) {
+            Self().List(AsList(*value), tmpl, depth);
+        } else {
+            Self().Scalar(value);
         }
     }
 
-private:
+protected:
     void Indent(std::size_t depth) {
         out_.Put('\n');
         out_.PutRepeat(' ', 2 * depth);
+    }
+
+    Writer& out_;
+
+private:
+    Derived& Self() { return static_cast<Derived&>(*this); }
+    LayoutCache cache_;
+};
+
+// ---- json ----
+
+class JsonFormatter : public TreeWriter<JsonFormatter> {
+public:
+    using TreeWriter::TreeWriter;
+
+    static std::string Key(const std::string& name) {
+        std::string key;
+        {
+            Writer writer(&key, 256);
+            PutJsonString(writer, name);
+            writer.Put(": ", 2);
+        }
+        return key;
+    }
+
+    void Scalar(const MetaObject* value) {
+        if (value == nullptr || !value->HasValue()) {
+            out_.Put("null", 4);
+        } else if (value->GetType() == MetaObj::MetaTypeString) {
+            PutJsonString(out_, static_cast<const MetaString*>(value)->GetValue());
+        } else if (value->GetType() == MetaObj::MetaTypeInt) {
+            out_.PutInt(static_cast<const MetaInt*>(value)->GetValue());
+        } else if (static_cast<const MetaBool*>(value)->GetValue()) {
+            out_.Put("true", 4);
+        } else {
+            out_.Put("false", 5);
+        }
     }
 
     void List(const MetaList& list, const MetaObject* tmpl, std::size_t depth) {
@@ -129,13 +147,9 @@ private:
         out_.Put(']');
     }
 
-    void Struct(const MetaStruct& row, const MetaStruct* tmpl, std::size_t depth) {
-        Layout& layout = cache_.For(row, tmpl, JsonKey);
-        layout.columns.Map(row);
-        std::vector<const MetaObject*>& cells = cache_.CellsAt(depth);
-        std::vector<std::size_t>& extras = cache_.ExtrasAt(depth);
-        cells = layout.columns.Cells();
-        extras = layout.columns.Extras();
+    void Struct(const MetaStruct& row, const MetaStruct* tmpl, const Layout& layout,
+                const std::vector<const MetaObject*>& cells,
+                const std::vector<std::size_t>& extras, std::size_t depth) {
         if (cells.empty() && extras.empty()) {
             out_.Put("{}", 2);
             return;
@@ -155,72 +169,39 @@ private:
             first = false;
             Indent(depth + 1);
             const MetaStruct::Field& field = fields[extras[e]];
-            PutJsonString(out_, field.first);
-            out_.Put(": ", 2);
+            out_.Put(Key(field.first));
             Value(field.second.get(), nullptr, depth + 1);
         }
         Indent(depth);
         out_.Put('}');
     }
-
-    Writer& out_;
-    LayoutCache cache_;
 };
 
 // ---- xml ----
 
-std::string XmlFieldTag(const std::string& name) {
-    std::string tag;
-    {
-        Writer writer(&tag, 256);
-        writer.PutText("<field name=\"");
-        PutXmlText(writer, name, true);
-        writer.Put("\">", 2);
-    }
-    return tag;
-}
-
-class XmlFormatter {
+class XmlFormatter : public TreeWriter<XmlFormatter> {
 public:
-    explicit XmlFormatter(Writer& out) : out_(out) {}
+    using TreeWriter::TreeWriter;
 
-    // One element for the value, starting at the current position (already indented).
-    void Value(const MetaObject* value, const MetaObject* tmpl, std::size_t depth) {
-        if (value == nullptr) {
-            out_.PutText("<string null=\"true\"/>");
-            return;
+    static std::string Key(const std::string& name) {
+        std::string tag;
+        {
+            Writer writer(&tag, 256);
+            writer.PutText("<field name=\"");
+            PutXmlText(writer, name, true);
+            writer.Put("\">", 2);
         }
-        switch (value->GetType()) {
-            case MetaObj::MetaTypeString:
-                Scalar("string", value);
-                return;
-            case MetaObj::MetaTypeInt:
-                Scalar("int", value);
-                return;
-            case MetaObj::MetaTypeBool:
-                Scalar("bool", value);
-                return;
-            case MetaObj::MetaTypeStruct: {
-                const MetaStruct& row = AsStruct(*value);
-                Struct(row, TemplateFor(tmpl, row.GetName()), depth);
-                return;
-            }
-            case MetaObj::MetaTypeList:
-                List(AsList(*value), tmpl, depth);
-                return;
-        }
+        return tag;
     }
 
-private:
-    void Indent(std::size_t depth) {
-        out_.Put('\n');
-        out_.PutRepeat(' ', 2 * depth);
-    }
-
-    void Scalar(const char* kind, const MetaObject* value) {
+    // One element for the scalar; without a value, an empty element marked null.
+    void Scalar(const MetaObject* value) {
+        const char* kind = "string";
+        if (value != nullptr && value->GetType() == MetaObj::MetaTypeInt) kind = "int";
+        if (value != nullptr && value->GetType() == MetaObj::MetaTypeBool) kind = "bool";
         out_.Put('<');
         out_.PutText(kind);
-        if (!value->HasValue()) {
+        if (value == nullptr || !value->HasValue()) {
             out_.PutText(" null=\"true\"/>");
             return;
         }
@@ -256,26 +237,9 @@ private:
         out_.PutText("</list>");
     }
 
-    void Field(const std::string& tag, const MetaObject* value, const MetaObject* tmpl,
-               std::size_t depth) {
-        out_.Put(tag);
-        if (value != nullptr && !IsScalar(*value)) {
-            Indent(depth + 1);
-            Value(value, tmpl, depth + 1);
-            Indent(depth);
-        } else {
-            Value(value, tmpl, depth + 1);
-        }
-        out_.PutText("</field>");
-    }
-
-    void Struct(const MetaStruct& row, const MetaStruct* tmpl, std::size_t depth) {
-        Layout& layout = cache_.For(row, tmpl, XmlFieldTag);
-        layout.columns.Map(row);
-        std::vector<const MetaObject*>& cells = cache_.CellsAt(depth);
-        std::vector<std::size_t>& extras = cache_.ExtrasAt(depth);
-        cells = layout.columns.Cells();
-        extras = layout.columns.Extras();
+    void Struct(const MetaStruct& row, const MetaStruct* tmpl, const Layout& layout,
+                const std::vector<const MetaObject*>& cells,
+                const std::vector<std::size_t>& extras, std::size_t depth) {
         out_.PutText("<structure name=\"");
         PutXmlText(out_, row.GetName(), true);
         if (cells.empty() && extras.empty()) {
@@ -292,14 +256,25 @@ private:
         for (std::size_t e = 0; e < extras.size(); ++e) {
             Indent(depth + 1);
             const MetaStruct::Field& field = fields[extras[e]];
-            Field(XmlFieldTag(field.first), field.second.get(), nullptr, depth + 1);
+            Field(Key(field.first), field.second.get(), nullptr, depth + 1);
         }
         Indent(depth);
         out_.PutText("</structure>");
     }
 
-    Writer& out_;
-    LayoutCache cache_;
+private:
+    void Field(const std::string& tag, const MetaObject* value, const MetaObject* tmpl,
+               std::size_t depth) {
+        out_.Put(tag);
+        if (value != nullptr && !IsScalar(*value)) {
+            Indent(depth + 1);
+            Value(value, tmpl, depth + 1);
+            Indent(depth);
+        } else {
+            Value(value, tmpl, depth + 1);
+        }
+        out_.PutText("</field>");
+    }
 };
 
 }  // namespace

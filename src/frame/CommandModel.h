@@ -2,7 +2,7 @@
 //
 // A command class derives virtually from Kitbase::AutoCli::Command, sets its description, metadata
 // and default formatter parameters in its constructor, and implements three hooks. What those hooks
-// share lives here: building parameter specifications and result templates from short tables,
+// share lives here: declaring parameters and building result templates from short tables,
 // setting a result, and the handler that turns a host-control failure into the output's error.
 //
 // Nothing here keeps state. The helpers only call the framework and the host-control library;
@@ -60,12 +60,12 @@ struct ParamDef {
     const char* regex = nullptr;
 };
 
-// The input specification of the parameters, in declaration order; empty for no parameters.
+// The command's parameters, in declaration order; empty for none.
 InputSpecPtr MakeInputSpec(std::initializer_list<ParamDef> parameters = {});
 
-// An output specification whose result has the template's shape.
+// The result's shape: that of the template.
 OutputSpecPtr MakeOutputSpec(const boost::shared_ptr<MetaObj::MetaObject>& resultTemplate);
-// The output specifications of the plain result kinds and of a list of structures.
+// The result shapes of the plain result kinds and of a list of structures.
 OutputSpecPtr BoolOutputSpec();
 OutputSpecPtr StringOutputSpec();
 OutputSpecPtr IntOutputSpec();

@@ -1,4 +1,4 @@
-// Meta objects and call specifications: values, field order, list kinds, misuse, and what an
+// Meta objects and call descriptions: values, field order, list kinds, misuse, and what an
 // Input answers for each kind of parameter.
 #include <kitbase/CallSpec.h>
 #include <kitbase/MetaObj.h>

@@ -112,7 +112,7 @@ TEST(Tree, CommandSettingsReplaceTheirKeyInPlace) {
 
 TEST(Tree, CommandHooksAreCalledThroughTheFramework) {
     boost::shared_ptr<StubCommand> command = StubCommand::New();
-    // A command that hands back no specifications gets empty ones.
+    // A command that hands back no parameter list or result shape gets empty ones.
     ASSERT_TRUE(command->GetInputSpec());
     EXPECT_TRUE(command->GetInputSpec()->GetParameters().empty());
     EXPECT_EQ(2, command->inputCalls);
