@@ -1,7 +1,9 @@
 #include <norlithctl/QuillUserLib.h>
 
 #include <simhost/Call.h>
-#include <simhost/domains/Observations.h>
+#include <simhost/Kernel.h>
+#include <simhost/Time.h>
+#include <simhost/domains/Logs.h>
 
 #include <atomic>
 #include <cstdarg>
@@ -27,7 +29,7 @@ int Guard(Body&& body) {
 
 extern "C" int QuillUserLib_Init(void) {
     return Guard([] {
-        simhost::Call call("QuillUserLib_Init");
+        simhost::Call call(simhost::Op::QuillUserLib_Init);
         g_open = true;
     });
 }
@@ -49,13 +51,16 @@ extern "C" int QuillUserLib_AddQuill(const char* format, ...) {
     va_end(args);
     if (size < 0) return -1;
     return Guard([&] {
-        simhost::Call call("QuillUserLib_AddQuill", simhost::Args().Add("message", text));
+        simhost::Call call(simhost::Op::QuillUserLib_AddQuill, simhost::Args().Add("message", text));
         if (!g_open) throw simhost::HostError("the event library is not open");
-        simhost::observations::Post(call, text);
+        simhost::observations::Entry entry;
+        entry.time = simhost::FormatUtc(simhost::kernel::HostNowMicros(call), true);
+        entry.message = text;
+        call.Change([&](simhost::Db& db) { simhost::Items<simhost::observations::Entry>(db).Append(entry); });
     });
 }
 
 extern "C" void QuillUserLib_Close(void) {
-    Guard([] { simhost::Call call("QuillUserLib_Close"); });
+    Guard([] { simhost::Call call(simhost::Op::QuillUserLib_Close); });
     g_open = false;
 }

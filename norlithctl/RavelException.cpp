@@ -1,5 +1,29 @@
 #include <norlithctl/RavelException.h>
 #include <norlithctl/RavelObject.h>
+#include <norlithctl/Testing.h>
+
+#include "HostCall.h"
+
+#include <simhost/Events.h>
+
+#include <atomic>
+
+namespace norlithctl {
+namespace {
+std::atomic<long> g_live{0};
+}  // namespace
+
+}  // namespace norlithctl
+
+namespace NorlithCtl {
+namespace Testing {
+long LiveObjects() { return norlithctl::g_live.load(); }
+}  // namespace Testing
+
+LiveObject::LiveObject() { ++norlithctl::g_live; }
+LiveObject::LiveObject(const LiveObject&) { ++norlithctl::g_live; }
+LiveObject::~LiveObject() { --norlithctl::g_live; }
+}  // namespace NorlithCtl
 
 namespace Ravel {
 namespace Lib {
@@ -13,14 +37,14 @@ RavelException::~RavelException() noexcept {}
 
 std::string RavelException::GetMessage(char form) const {
     if (form == 0 || quill_.IsEmpty()) return text_;
-    std::string args;
-    for (const std::string& arg : quill_.GetArgs()) args += (args.empty() ? "" : ", ") + arg;
-    return text_ + " [" + quill_.GetId() + ": " + args + "]";
+    return simhost::FormatEvent(simhost::Event{quill_.GetId(), quill_.GetArgs()});
 }
 
 const char* RavelException::what() const noexcept { return text_.c_str(); }
 
-RavelObject::~RavelObject() {}
+RavelObject::RavelObject() { ++norlithctl::g_live; }
+RavelObject::RavelObject(const RavelObject&) { ++norlithctl::g_live; }
+RavelObject::~RavelObject() { --norlithctl::g_live; }
 
 }  // namespace Lib
 }  // namespace Ravel

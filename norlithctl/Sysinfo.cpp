@@ -10,7 +10,7 @@ namespace NorlithCtl {
 namespace Util {
 namespace {
 
-const std::string kPrefix = "NorlithCtl::Util::Sysinfo::";
+using simhost::Op;
 
 std::string NodeName(int node) { return "kernel information node " + std::to_string(node); }
 
@@ -29,7 +29,7 @@ nlohmann::ordered_json PathJson(const std::vector<std::string>& path) {
 
 Sysinfo::Sysinfo(int node) : node_(node) {
     norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + "Sysinfo", simhost::Args().Add("node", node));
+        simhost::Call call(Op::Sysinfo_New, simhost::Args().Add("node", node));
         KnownNode(node);
     });
 }
@@ -38,7 +38,7 @@ Sysinfo::~Sysinfo() {}
 
 void Sysinfo::Get(void* buffer, std::size_t size) {
     norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + "Get", simhost::Args()
+        simhost::Call call(Op::Sysinfo_Get, simhost::Args()
                                                 .Add("node", node_)
                                                 .Add("instance", PathJson(instance_path_))
                                                 .Add("size", size));
@@ -55,7 +55,7 @@ void Sysinfo::Get(void* buffer, std::size_t size) {
 
 void Sysinfo::List(std::vector<std::string>& names) {
     norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + "List", simhost::Args()
+        simhost::Call call(Op::Sysinfo_List, simhost::Args()
                                                  .Add("node", node_)
                                                  .Add("instance", PathJson(instance_path_)));
         const simhost::SysinfoNode& node = KnownNode(node_);
@@ -66,7 +66,7 @@ void Sysinfo::List(std::vector<std::string>& names) {
 
 void Sysinfo::AddInstancePath(const std::string& path) {
     norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + "AddInstancePath",
+        simhost::Call call(Op::Sysinfo_AddInstancePath,
                            simhost::Args().Add("node", node_).Add("path", path));
         if (!KnownNode(node_).list) throw simhost::HostError(NodeName(node_) + " has no instances");
         instance_path_.push_back(path);
@@ -75,7 +75,7 @@ void Sysinfo::AddInstancePath(const std::string& path) {
 
 void Sysinfo::ResetInstance() {
     norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + "ResetInstance", simhost::Args().Add("node", node_));
+        simhost::Call call(Op::Sysinfo_ResetInstance, simhost::Args().Add("node", node_));
         instance_path_.clear();
     });
 }

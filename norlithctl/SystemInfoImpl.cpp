@@ -8,13 +8,14 @@ namespace NorlithCtl {
 namespace System {
 namespace {
 
-const std::string kPrefix = "NorlithCtl::System::SystemInfoImpl::";
+using simhost::Op;
+using simhost::identity::Identity;
 
 // Reads one identity field under the named operation.
-std::string IdentityField(const char* operation, std::string simhost::identity::Identity::*field) {
+std::string IdentityField(Op operation, std::string Identity::*field) {
     return norlithctl::HostCall([&] {
-        simhost::Call call(kPrefix + operation);
-        return simhost::identity::Read(call.db()).*field;
+        simhost::Call call(operation);
+        return call.Read<Identity>().*field;
     });
 }
 
@@ -22,26 +23,26 @@ std::string IdentityField(const char* operation, std::string simhost::identity::
 
 SystemInfoImpl::SystemInfoImpl() {
     // The object keeps no state; constructing it opens the host (and may fault).
-    norlithctl::HostCall([] { simhost::Call call(kPrefix + "SystemInfoImpl"); });
+    norlithctl::HostCall([] { simhost::Call call(Op::SystemInfoImpl_New); });
 }
 
 SystemInfoImpl::~SystemInfoImpl() {}
 
 std::string SystemInfoImpl::GetSystemUuid() {
-    return IdentityField("GetSystemUuid", &simhost::identity::Identity::system_uuid);
+    return IdentityField(Op::SystemInfoImpl_GetSystemUuid, &Identity::system_uuid);
 }
 
 std::string SystemInfoImpl::GetBootNicMacAddress() {
-    return IdentityField("GetBootNicMacAddress", &simhost::identity::Identity::boot_nic_mac);
+    return IdentityField(Op::SystemInfoImpl_GetBootNicMacAddress, &Identity::boot_nic_mac);
 }
 
 std::string SystemInfoImpl::GetBootFsUUID() {
-    return IdentityField("GetBootFsUUID", &simhost::identity::Identity::boot_fs_uuid);
+    return IdentityField(Op::SystemInfoImpl_GetBootFsUUID, &Identity::boot_fs_uuid);
 }
 
 std::string SystemInfoImpl::GetStatelessBootNicMacAddress() {
-    return IdentityField("GetStatelessBootNicMacAddress",
-                         &simhost::identity::Identity::stateless_boot_nic_mac);
+    return IdentityField(Op::SystemInfoImpl_GetStatelessBootNicMacAddress,
+                         &Identity::stateless_boot_nic_mac);
 }
 
 }  // namespace System

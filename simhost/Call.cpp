@@ -1,5 +1,6 @@
 #include <simhost/Call.h>
 
+#include <simhost/Faults.h>
 #include <simhost/Trace.h>
 
 namespace simhost {
@@ -9,48 +10,40 @@ std::string Args::Text() const {
     return json_.dump(-1, ' ', false, nlohmann::ordered_json::error_handler_t::replace);
 }
 
-Call::Call(std::string operation, Args args)
-    : operation_(std::move(operation)), args_(std::move(args)), session_(Begin(operation_, args_)) {
+Call::Call(Op operation, Args args)
+    : operation_(operation), args_(std::move(args)), session_(Begin(operation_, args_)) {
     RaiseFault();
 }
 
-Session Call::Begin(const std::string& operation, const Args& args) {
-    if (trace::Enabled()) trace::Record(operation, trace::WithArguments() ? args.Text() : "");
+std::string Call::Root() const { return RootPath(StateDir()); }
+
+const char* Call::OperationName() const { return simhost::OperationName(operation_); }
+
+Session Call::Begin(Op operation, const Args& args) {
+    if (trace::Enabled())
+        trace::Record(simhost::OperationName(operation), trace::WithArguments() ? args.Text() : "");
     return Session::OpenCurrent();
 }
 
 void Call::RaiseFault() {
+    const std::string name = OperationName();
     {
         // The common path: one indexed look-up, no transaction of our own.
         Query probe = db().Cached("SELECT 1 FROM faults WHERE operation = ?1");
-        probe->Bind(1, operation_);
+        probe->Bind(1, name);
         if (!probe->Step()) return;
     }
     // Consume the fault in a write transaction, so that concurrent processes consume a counted
     // fault exactly once per remaining call.
-    std::string message;
+    std::optional<Fault> fault;
     {
         WriteTxn txn(db());
-        bool counted;
-        std::int64_t remaining;
-        {
-            Query select = db().Cached("SELECT message, remaining FROM faults WHERE operation = ?1");
-            select->Bind(1, operation_);
-            if (!select->Step()) return;  // consumed by another process meanwhile
-            message = select->Text(0);
-            counted = !select->IsNull(1);
-            remaining = select->Int(1);
-        }
-        if (counted && remaining <= 1)
-            db().Cached("DELETE FROM faults WHERE operation = ?1")->Bind(1, operation_).Run();
-        else if (counted)
-            db().Cached("UPDATE faults SET remaining = remaining - 1 WHERE operation = ?1")
-                ->Bind(1, operation_)
-                .Run();
-        AppendJournal(db(), "fault", operation_, args_.Text());
+        fault = ConsumeFault(db(), name);
+        if (!fault) return;  // consumed by another process meanwhile
+        AppendJournal(db(), "fault", name, args_.Text());
         txn.Commit();
     }
-    throw HostError(message);
+    throw HostError(fault->message, HostError::Code::kFailed, fault->event);
 }
 
 }  // namespace simhost

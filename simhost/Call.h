@@ -2,9 +2,12 @@
 //
 // Constructing a Call records it in the call trace, opens the current host (QUARN_HOST_STATE
 // or the default location) and raises a fault set on the operation: the fault is consumed and
-// journaled in one transaction and HostError carries its message. The Call then gives the
-// operation exclusive use of the host's connection until it is destroyed. Change() runs a
-// modification in a write transaction together with its journal entry.
+// journaled in one transaction and HostError carries its message and event. The Call then gives
+// the operation exclusive use of the host's connection until it is destroyed.
+//
+// Reads go through Read<T>() and Items<T>(); every change goes through Change() or Update<T>(),
+// which run it in one write transaction together with its journal entry, so a change and its
+// record commit or vanish together.
 //
 // Args are the operation's arguments as they are recorded (journal, trace); an argument added
 // with Secret() is recorded as "***" and its value never reaches the record.
@@ -14,6 +17,8 @@
 
 #include <simhost/Db.h>
 #include <simhost/Journal.h>
+#include <simhost/Operations.h>
+#include <simhost/State.h>
 #include <simhost/Store.h>
 
 #include <nlohmann/json.hpp>
@@ -42,28 +47,57 @@ private:
 
 class SIMHOST_API Call {
 public:
-    explicit Call(std::string operation, Args args = Args());
+    explicit Call(Op operation, Args args = Args());
     Call(const Call&) = delete;
     Call& operator=(const Call&) = delete;
 
     Db& db() { return session_.db(); }
     const std::string& StateDir() const { return session_.dir(); }
-    const std::string& Operation() const { return operation_; }
+    // The host's own file system: StateDir()/root.
+    std::string Root() const;
+    Op Operation() const { return operation_; }
+    const char* OperationName() const;
 
-    // Runs change(db) in a write transaction and journals the call in the same transaction.
+    // Runs change(db) in a write transaction and journals the call (with its own arguments, or
+    // with journal_args) in the same transaction.
     template <class Fn>
     void Change(Fn&& change) {
+        Change(std::forward<Fn>(change), args_);
+    }
+    template <class Fn>
+    void Change(Fn&& change, const Args& journal_args) {
         WriteTxn txn(db());
         change(db());
-        AppendJournal(db(), "change", operation_, args_.Text());
+        AppendJournal(db(), "change", OperationName(), journal_args.Text());
         txn.Commit();
     }
 
+    // The singleton domain T's current value.
+    template <class T>
+    T Read() {
+        return Load<T>(db());
+    }
+    // Changes the singleton domain T: update(T&) on its current value, checked against its
+    // rules and stored in one journaled transaction.
+    template <class T, class Fn>
+    void Update(Fn&& update) {
+        Change([&](Db& db) {
+            T state = Load<T>(db);
+            update(state);
+            Save(db, state);
+        });
+    }
+    // The collection or log domain T (use inside Change to modify it).
+    template <class T>
+    simhost::Items<T> Items() {
+        return simhost::Items<T>(db());
+    }
+
 private:
-    static Session Begin(const std::string& operation, const Args& args);
+    static Session Begin(Op operation, const Args& args);
     void RaiseFault();
 
-    std::string operation_;
+    Op operation_;
     Args args_;
     Session session_;
 };

@@ -110,6 +110,8 @@ std::int64_t Db::QueryInt(const std::string& sql) {
 
 std::int64_t Db::LastInsertRowid() const { return sqlite3_last_insert_rowid(db_); }
 
+std::int64_t Db::Changes() const { return sqlite3_changes(db_); }
+
 WriteTxn::WriteTxn(Db& db) : db_(db) { db_.Exec("BEGIN IMMEDIATE"); }
 
 WriteTxn::~WriteTxn() {

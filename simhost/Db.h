@@ -78,6 +78,8 @@ public:
     // One integer read by a query returning a single row and column (e.g. a pragma).
     std::int64_t QueryInt(const std::string& sql);
     std::int64_t LastInsertRowid() const;
+    // Rows changed by the last INSERT, UPDATE or DELETE.
+    std::int64_t Changes() const;
 
     sqlite3* Handle() const { return db_; }
     const std::string& Path() const { return path_; }

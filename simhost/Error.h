@@ -1,34 +1,56 @@
-// Errors raised by the simulated host.
+// The one error type of the simulated host.
 //
-// HostError is what every host operation throws: a host that cannot be opened, a database error,
-// a value a rule refuses, or a fault set on the operation. Its text is the complete message a
-// user sees; the host-control library turns it into Ravel::Lib::RavelException at its boundary.
-// ScenarioError is a HostError raised while a scenario is parsed or validated; its text starts
-// with "scenario: " and the JSON location of the first problem. HostExists refuses to create a
-// host over an existing one.
+// HostError is what every part of the host throws: a host that cannot be opened or is damaged, a
+// scenario that is refused, a value a rule refuses, or a fault set on an operation. Its text is
+// the complete one-line message a user sees; its code tells callers what kind of failure it is,
+// and its event, when not empty, is the structured event record a fault or a rule attached (the
+// host-control library hands it on as the exception's Ravel::Lib::QuillMessage). The libraries
+// turn it into Ravel::Lib::RavelException in one place (norlithctl/HostCall.h).
 #pragma once
 
 #include <simhost/Export.h>
 
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 namespace simhost {
 
+// A structured event record: an identifier of the event catalog (Events.h) and its arguments.
+struct Event {
+    std::string id;
+    std::vector<std::string> args;
+
+    bool Empty() const { return id.empty() && args.empty(); }
+    bool operator==(const Event& other) const { return id == other.id && args == other.args; }
+};
+
 class SIMHOST_API HostError : public std::runtime_error {
 public:
-    explicit HostError(const std::string& message) : std::runtime_error(message) {}
+    enum class Code {
+        kFailed,    // an operation or a rule refused (faults included)
+        kScenario,  // a scenario was refused; the text starts with "scenario: " and a location
+        kExists,    // a host was to be created where one exists
+        kDamaged,   // the state directory holds something that is not a usable host
+    };
+
+    explicit HostError(const std::string& message, Code code = Code::kFailed, Event event = {})
+        : std::runtime_error(message), code_(code), event_(std::move(event)) {}
+
+    Code code() const { return code_; }
+    const Event& event() const { return event_; }
+
+private:
+    Code code_;
+    Event event_;
 };
 
-class SIMHOST_API ScenarioError : public HostError {
-public:
-    explicit ScenarioError(const std::string& message) : HostError(message) {}
-};
-
-// Raised when a host is to be created where one already exists.
-class SIMHOST_API HostExists : public HostError {
-public:
-    explicit HostExists(const std::string& message) : HostError(message) {}
-};
+// Helpers for the two special kinds, so call sites read as what they mean.
+inline HostError ScenarioError(const std::string& message) {
+    return HostError(message, HostError::Code::kScenario);
+}
+inline HostError HostExists(const std::string& message) {
+    return HostError(message, HostError::Code::kExists);
+}
 
 }  // namespace simhost

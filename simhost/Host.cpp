@@ -1,6 +1,6 @@
 #include <simhost/Host.h>
 
-#include <simhost/Domain.h>
+#include <simhost/State.h>
 #include <simhost/Scenario.h>
 #include <simhost/Store.h>
 
@@ -35,7 +35,8 @@ std::string Host::Export() {
     Session session = Session::Open(dir_);
     ReadTxn snapshot(session.db());
     Scenario scenario;
-    for (const Domain* domain : Domains()) scenario.sections.push_back(domain->Read(session.db()));
+    for (const Domain* domain : Domains())
+        scenario.sections.push_back(domain->Read(session.db(), RootPath(dir_)));
     scenario.faults = ReadFaults(session.db());
     return ScenarioText(scenario);
 }
@@ -54,8 +55,8 @@ void WriteHost(const std::string& dir, Change change) {
 }  // namespace
 
 void Host::AddFault(const std::string& operation, const std::string& message,
-                    std::optional<std::int64_t> times) {
-    Fault fault{operation, message, times};
+                    std::optional<std::int64_t> times, Event event) {
+    Fault fault{operation, message, times, std::move(event)};
     std::string problem = CheckFault(fault);
     if (!problem.empty()) throw HostError(problem);
     WriteHost(dir_, [&](Db& db) { StoreFault(db, fault); });

@@ -4,8 +4,8 @@
 //
 // A Host names a state directory; each method opens that host through the process-wide
 // connection (creating it from the default scenario on first use, except Init) and works in
-// its own transaction. Everything throws HostError with a one-line message; Init throws
-// ScenarioError for a bad scenario and HostExists when a host is there and replace is false.
+// its own transaction. Everything throws HostError with a one-line message; Init's has code
+// kScenario for a bad scenario and kExists when a host is there and replace is false.
 #pragma once
 
 #include <simhost/Export.h>
@@ -45,8 +45,9 @@ public:
 
     // Sets a fault; times empty: every call fails; else the next `times` calls fail.
     // Replaces a fault already set on the operation.
+    // With an event, the operation's exception carries that event record too.
     void AddFault(const std::string& operation, const std::string& message,
-                  std::optional<std::int64_t> times = std::nullopt);
+                  std::optional<std::int64_t> times = std::nullopt, Event event = {});
     std::vector<Fault> Faults();
     void ClearFaults();
 

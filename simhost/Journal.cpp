@@ -1,9 +1,8 @@
 #include <simhost/Journal.h>
 
 #include <simhost/Db.h>
+#include <simhost/Time.h>
 
-#include <cstdio>
-#include <ctime>
 
 namespace simhost {
 
@@ -28,17 +27,5 @@ std::vector<JournalEntry> ReadJournal(Db& db) {
 }
 
 void DeleteJournal(Db& db) { db.Cached("DELETE FROM journal")->Run(); }
-
-std::string UtcNow() {
-    timespec now{};
-    clock_gettime(CLOCK_REALTIME, &now);
-    std::tm parts{};
-    gmtime_r(&now.tv_sec, &parts);
-    char text[64];
-    std::snprintf(text, sizeof text, "%04d-%02d-%02dT%02d:%02d:%02d.%03dZ", parts.tm_year + 1900,
-                  parts.tm_mon + 1, parts.tm_mday, parts.tm_hour, parts.tm_min, parts.tm_sec,
-                  static_cast<int>(now.tv_nsec / 1000000));
-    return text;
-}
 
 }  // namespace simhost

@@ -28,7 +28,4 @@ SIMHOST_API void AppendJournal(Db& db, const std::string& kind, const std::strin
 SIMHOST_API std::vector<JournalEntry> ReadJournal(Db& db);
 SIMHOST_API void DeleteJournal(Db& db);
 
-// The current UTC time in the journal's format.
-SIMHOST_API std::string UtcNow();
-
 }  // namespace simhost

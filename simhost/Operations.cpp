@@ -1,31 +1,15 @@
 #include <simhost/Operations.h>
 
-#include <simhost/Domain.h>
-#include <simhost/Records.h>
-
 #include <algorithm>
 #include <numeric>
 
 namespace simhost {
 namespace {
 
-// Operations that belong to no single domain: the objects' constructors and the event library's
-// session calls. Domains and the kernel information reader list their own.
-const char* const kCoreOperations[] = {
-    "NorlithCtl::System::SystemInfoImpl::SystemInfoImpl",
-    "QuillUserLib_Init",
-    "QuillUserLib_Close",
+const OperationInfo kOperations[] = {
+#define OPERATION(Id, name, doc) {Op::Id, name, doc},
+#include <simhost/Registry.def>
 };
-
-std::vector<std::string> Collect() {
-    std::vector<std::string> names(std::begin(kCoreOperations), std::end(kCoreOperations));
-    for (const std::string& name : SysinfoOperationNames()) names.push_back(name);
-    for (const Domain* domain : Domains())
-        for (const std::string& name : domain->OperationNames()) names.push_back(name);
-    std::sort(names.begin(), names.end());
-    names.erase(std::unique(names.begin(), names.end()), names.end());
-    return names;
-}
 
 std::size_t EditDistance(const std::string& a, const std::string& b) {
     std::vector<std::size_t> row(b.size() + 1);
@@ -42,10 +26,36 @@ std::size_t EditDistance(const std::string& a, const std::string& b) {
     return row[b.size()];
 }
 
+// The class part of a qualified name ("NorlithCtl::System::SystemInfoImpl"), or "" for the
+// event library's free functions.
+std::string ClassOf(const std::string& name) {
+    std::string::size_type colons = name.rfind("::");
+    return colons == std::string::npos ? "" : name.substr(0, colons);
+}
+
 }  // namespace
 
+const std::vector<OperationInfo>& Operations() {
+    static const std::vector<OperationInfo> all(std::begin(kOperations), std::end(kOperations));
+    return all;
+}
+
+const char* OperationName(Op op) { return kOperations[static_cast<std::size_t>(op)].name; }
+
+std::optional<Op> FindOperation(const std::string& name) {
+    for (const OperationInfo& info : kOperations)
+        if (name == info.name) return info.op;
+    return std::nullopt;
+}
+
 const std::vector<std::string>& KnownOperations() {
-    static const std::vector<std::string> names = Collect();
+    static const std::vector<std::string> names = [] {
+        std::vector<std::string> sorted;
+        for (const OperationInfo& info : kOperations) sorted.push_back(info.name);
+        std::sort(sorted.begin(), sorted.end());
+        sorted.erase(std::unique(sorted.begin(), sorted.end()), sorted.end());
+        return sorted;
+    }();
     return names;
 }
 
@@ -70,6 +80,31 @@ std::vector<std::string> NearestOperations(const std::string& name, std::size_t 
     std::vector<std::string> nearest;
     for (std::size_t i = 0; i < scored.size() && i < count; ++i) nearest.push_back(scored[i].second);
     return nearest;
+}
+
+std::string UnknownOperationText(const std::string& name) {
+    std::string hint;
+    for (const std::string& near : NearestOperations(name)) hint += (hint.empty() ? "" : ", ") + near;
+    return "unknown operation '" + name + "'" + (hint.empty() ? "" : " (nearest: " + hint + ")");
+}
+
+std::string OperationsMarkdown() {
+    std::string text =
+        "# Host operations\n\n"
+        "Every operation the host-control and event libraries serve. Each can be made to fail\n"
+        "with `quarnhost fault add NAME MESSAGE`; the journal and the call trace name them so.\n"
+        "This page is generated from simhost/Registry.def by `quarnhost operations`.\n";
+    std::string current = "\x01";
+    for (const OperationInfo& info : kOperations) {
+        std::string owner = ClassOf(info.name);
+        if (owner != current) {
+            current = owner;
+            text += "\n## " + (owner.empty() ? std::string("Event library") : "`" + owner + "`") +
+                    "\n\n| operation | what it does |\n|---|---|\n";
+        }
+        text += std::string("| `") + info.name + "` | " + info.doc + " |\n";
+    }
+    return text;
 }
 
 }  // namespace simhost

@@ -1,18 +1,29 @@
 #include <simhost/Records.h>
 
-#include <simhost/domains/Identity.h>
+#include <simhost/State.h>
+
+#include <norlithctl/Records.h>
+
+#include <algorithm>
+#include <cstring>
 
 namespace simhost {
 namespace {
 
+using NorlithCtl::Util::Records::Field;
+
+// Copies text into its field, leaving at least the field's last byte zero.
+void PutText(std::vector<unsigned char>& record, const Field& field, const std::string& text) {
+    std::memcpy(record.data() + field.offset, text.data(), std::min(text.size(), field.width - 1));
+}
+
 std::vector<unsigned char> ReadProductVersion(Db& db, const std::vector<std::string>&) {
-    auto record = identity::EncodeProductVersion(identity::Read(db));
-    return {record.begin(), record.end()};
+    return EncodeProductVersion(Load<identity::Identity>(db));
 }
 
 const SysinfoNode kNodes[] = {
-    {identity::kProductVersionNode, "product version", identity::kProductVersionSize,
-     ReadProductVersion, nullptr},
+    {NorlithCtl::Util::Records::ProductVersion::kNode, "product version",
+     NorlithCtl::Util::Records::ProductVersion::kSize, ReadProductVersion, nullptr},
 };
 
 }  // namespace
@@ -23,10 +34,14 @@ const SysinfoNode* FindSysinfoNode(int id) {
     return nullptr;
 }
 
-std::vector<std::string> SysinfoOperationNames() {
-    const std::string prefix = "NorlithCtl::Util::Sysinfo::";
-    return {prefix + "Sysinfo", prefix + "Get", prefix + "List", prefix + "AddInstancePath",
-            prefix + "ResetInstance"};
+std::vector<unsigned char> EncodeProductVersion(const identity::Identity& identity) {
+    using Layout = NorlithCtl::Util::Records::ProductVersion;
+    std::vector<unsigned char> record(Layout::kSize, 0);
+    PutText(record, Layout::kProduct, identity.product);
+    PutText(record, Layout::kVersion, identity.version);
+    PutText(record, Layout::kBuild, identity.build);
+    PutText(record, Layout::kUpdate, identity.update);
+    return record;
 }
 
 }  // namespace simhost

@@ -2,12 +2,15 @@
 // fixed-size binary records.
 //
 // Each node names its record size, whether it has instances, and how its record is produced:
-// read the owning domain's state, then encode it with that domain's pure encoder (state in, bytes
-// out), so encoders can be tested and fuzzed without a host. A node with instances also lists
-// them. Adding a node is one entry in the table in Records.cpp.
+// read the owning domain's state, then encode it with a pure encoder (state in, bytes out) that
+// follows the node's layout in <norlithctl/Records.h>, so encoders can be tested and fuzzed
+// without a host. A node with instances also lists them. Adding a node is one entry in the table
+// in Records.cpp.
 #pragma once
 
 #include <simhost/Export.h>
+
+#include <simhost/domains/Identity.h>
 
 #include <cstddef>
 #include <string>
@@ -31,7 +34,8 @@ struct SysinfoNode {
 // The node with this identifier, or nullptr.
 SIMHOST_API const SysinfoNode* FindSysinfoNode(int id);
 
-// Operation names of the kernel information reader, for the operation registry.
-SIMHOST_API std::vector<std::string> SysinfoOperationNames();
+// Node 1238 of an identity. The texts must be within the identity's limits (which leave room
+// for each field's terminating NUL).
+SIMHOST_API std::vector<unsigned char> EncodeProductVersion(const identity::Identity& identity);
 
 }  // namespace simhost

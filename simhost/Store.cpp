@@ -1,6 +1,6 @@
 #include <simhost/Store.h>
 
-#include <simhost/Domain.h>
+#include <simhost/State.h>
 #include <simhost/Host.h>
 
 #include <sqlite3.h>
@@ -26,16 +26,15 @@ constexpr std::int32_t kApplicationId = 0x514E4853;
 // Tables that belong to no domain: faults and the journal.
 const char* const kCoreSchema =
     "CREATE TABLE faults ("
-    " operation TEXT PRIMARY KEY, message TEXT NOT NULL, remaining INTEGER) WITHOUT ROWID;"
+    " operation TEXT PRIMARY KEY, message TEXT NOT NULL, remaining INTEGER,"
+    " event TEXT NOT NULL DEFAULT '') WITHOUT ROWID;"
     "CREATE TABLE journal ("
     " sequence INTEGER PRIMARY KEY AUTOINCREMENT, time TEXT NOT NULL, kind TEXT NOT NULL,"
     " operation TEXT NOT NULL, arguments TEXT NOT NULL);";
 
 const std::string& FullSchema() {
     static const std::string schema = [] {
-        std::string text = kCoreSchema;
-        for (const Domain* domain : Domains()) text += domain->Schema();
-        return text;
+        return std::string(kCoreSchema) + store::Schema();
     }();
     return schema;
 }
@@ -129,8 +128,9 @@ std::unique_ptr<Db> OpenDatabase(const std::string& dir, bool any_schema) {
     return db;
 }
 
-void WriteState(Db& db, const Scenario& scenario) {
-    for (const auto& section : scenario.sections) section->Write(db);
+void WriteState(Db& db, const Scenario& scenario, const std::string& root) {
+    WriteContext context{db, root};
+    for (const auto& section : scenario.sections) section->Write(context);
     for (const Fault& fault : scenario.faults) StoreFault(db, fault);
 }
 
@@ -142,12 +142,39 @@ void SyncDirectory(const std::string& dir) {
     }
 }
 
+// A fresh, empty directory beside root/ that a new state's files are written into before it
+// takes root/'s place.
+std::string PrepareRoot(const std::string& dir) {
+    std::string staged = RootPath(dir) + ".new";
+    std::error_code ignored;
+    std::filesystem::remove_all(staged, ignored);
+    MakeDirectory(dir, staged);
+    return staged;
+}
+
+// Puts the staged root in root/'s place; the previous root/ is removed.
+void SwapRoot(const std::string& dir, const std::string& staged) {
+    std::string root = RootPath(dir);
+    std::string old = root + ".old";
+    std::error_code ignored;
+    std::filesystem::remove_all(old, ignored);
+    if (std::rename(root.c_str(), old.c_str()) != 0 && errno != ENOENT)
+        CannotOpen(dir, "cannot replace '" + root + "': " + std::strerror(errno));
+    if (std::rename(staged.c_str(), root.c_str()) != 0) {
+        int error = errno;
+        std::rename(old.c_str(), root.c_str());
+        CannotOpen(dir, "cannot replace '" + root + "': " + std::strerror(error));
+    }
+    std::filesystem::remove_all(old, ignored);
+}
+
 // Builds the host under a temporary name and renames it into place; the caller holds the
 // creation lock and has seen that no host.db exists.
 void CreateNew(const std::string& dir, const Scenario& scenario) {
     std::string path = DatabasePath(dir);
     std::string temporary = path + ".new";
     for (const char* suffix : {"", "-journal", "-wal", "-shm"}) std::remove((temporary + suffix).c_str());
+    std::string staged_root = PrepareRoot(dir);
     try {
         Db db(temporary, true);
         db.Exec("PRAGMA application_id=" + std::to_string(kApplicationId) + ";" +
@@ -155,16 +182,18 @@ void CreateNew(const std::string& dir, const Scenario& scenario) {
                 "PRAGMA journal_mode=WAL;");
         WriteTxn txn(db);
         db.Exec(FullSchema());
-        WriteState(db, scenario);
+        WriteState(db, scenario, staged_root);
         txn.Commit();
     } catch (const HostError& error) {
         std::remove(temporary.c_str());
+        std::error_code ignored;
+        std::filesystem::remove_all(staged_root, ignored);
         CannotOpen(dir, error.what());
     }
     // WAL files left by a host that was removed would be replayed into the new one.
     std::remove((path + "-wal").c_str());
     std::remove((path + "-shm").c_str());
-    MakeDirectory(dir, RootPath(dir));
+    SwapRoot(dir, staged_root);
     if (std::rename(temporary.c_str(), path.c_str()) != 0) {
         int error = errno;
         std::remove(temporary.c_str());
@@ -176,6 +205,8 @@ void CreateNew(const std::string& dir, const Scenario& scenario) {
 // Replaces an existing host's whole state, schema included, in one write transaction.
 void ReplaceExisting(const std::string& dir, const Scenario& scenario) {
     std::unique_ptr<Db> db = OpenDatabase(dir, true);
+    std::string staged_root = PrepareRoot(dir);
+    try {
     WriteTxn txn(*db);
     std::vector<std::pair<std::string, std::string>> objects;
     {
@@ -194,10 +225,15 @@ void ReplaceExisting(const std::string& dir, const Scenario& scenario) {
     }
     db->Exec("DELETE FROM sqlite_sequence");
     db->Exec(FullSchema());
-    WriteState(*db, scenario);
+    WriteState(*db, scenario, staged_root);
     db->Exec("PRAGMA user_version=" + std::to_string(SchemaVersion()));
     txn.Commit();
-    MakeDirectory(dir, RootPath(dir));
+    } catch (...) {
+        std::error_code ignored;
+        std::filesystem::remove_all(staged_root, ignored);
+        throw;
+    }
+    SwapRoot(dir, staged_root);
 }
 
 }  // namespace
@@ -220,7 +256,9 @@ std::string RootPath(const std::string& dir) { return dir + "/root"; }
 std::int32_t SchemaVersion() {
     static const std::int32_t version = [] {
         std::uint32_t hash = 2166136261u;  // FNV-1a
-        for (unsigned char c : FullSchema()) hash = (hash ^ c) * 16777619u;
+        std::string shape = FullSchema();
+        for (const Domain* domain : Domains()) shape += std::string(domain->Name()) + domain->Shape();
+        for (unsigned char c : shape) hash = (hash ^ c) * 16777619u;
         return static_cast<std::int32_t>((hash & 0x7FFFFFFFu) | 1u);
     }();
     return version;

@@ -2,6 +2,10 @@
 //
 // Every host-control operation may throw Ravel::Lib::RavelException; plug-ins throw it too for
 // their own validation failures. The exception owns copies of its text and of its QuillMessage.
+//
+// A QuillMessage names an event of the host's event catalog and carries its arguments; the
+// catalog gives each event a text with {0}, {1}, ... for the arguments (docs/simhost.md lists
+// it). Host errors raised by faults or rules that carry an event fill it in.
 #pragma once
 
 #include <norlithctl/Export.h>
@@ -36,8 +40,10 @@ public:
     explicit RavelException(const std::string& text);
     ~RavelException() noexcept override;
 
-    // The message text. The argument selects the form: 0 the plain text; any other value the
-    // text followed, when the event record is not empty, by " [" id ": " args joined by ", " "]".
+    // The message. The argument selects the form: 0 the plain text; any other value the text
+    // formed from the event record (the catalog's text of its event with its arguments filled
+    // in; an event the catalog lacks gives "id(arg, ...)"), or the plain text when the record
+    // is empty.
     virtual std::string GetMessage(char form) const;
     const QuillMessage& GetQuillMessage() const { return quill_; }
 

@@ -13,7 +13,8 @@ public:
     virtual ~RavelObject();
 
 protected:
-    RavelObject() {}
+    RavelObject();
+    RavelObject(const RavelObject&);
 };
 
 }  // namespace Lib

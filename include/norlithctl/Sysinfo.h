@@ -1,4 +1,5 @@
 // NorlithCtl::Util::Sysinfo: a handle on one node of the kernel's information tree.
+// <norlithctl/Records.h> gives the nodes this library serves and their record layouts.
 //
 // A node is addressed by its numeric identifier. Get() fills a caller-owned buffer with the
 // node's fixed-size binary record, encoded from the host's current state. Nodes with instances
@@ -11,6 +12,7 @@
 #pragma once
 
 #include <norlithctl/Export.h>
+#include <norlithctl/Testing.h>
 
 #include <cstddef>
 #include <string>
@@ -21,11 +23,6 @@ namespace Util {
 
 class NORLITHCTL_API Sysinfo {
 public:
-    // Kernel information node identifiers this library serves.
-    enum Node {
-        ProductVersion = 1238,  // 312 bytes: product@0, version@32, build@64, update@160
-    };
-
     explicit Sysinfo(int node);
     virtual ~Sysinfo();
 
@@ -42,6 +39,7 @@ private:
 
     int node_;
     std::vector<std::string> instance_path_;
+    LiveObject live_;
 };
 
 }  // namespace Util

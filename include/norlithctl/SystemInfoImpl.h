@@ -7,6 +7,8 @@
 
 #include <norlithctl/Export.h>
 
+#include <norlithctl/Testing.h>
+
 #include <string>
 
 namespace NorlithCtl {
@@ -29,6 +31,8 @@ public:
 private:
     SystemInfoImpl(const SystemInfoImpl&);
     SystemInfoImpl& operator=(const SystemInfoImpl&);
+
+    LiveObject live_;
 };
 
 }  // namespace System

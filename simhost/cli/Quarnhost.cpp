@@ -139,10 +139,12 @@ void Init(Host& host, Words& words) {
     bool existed = host.Exists();
     try {
         host.Init(text, words.Has("--force"));
-    } catch (const ScenarioError& error) {
-        Failure((source.empty() ? "default scenario" : source) + ": " + error.what());
-    } catch (const HostExists& error) {
-        Failure(std::string(error.what()) + "; use --force to replace it");
+    } catch (const HostError& error) {
+        if (error.code() == HostError::Code::kScenario)
+            Failure((source.empty() ? "default scenario" : source) + ": " + error.what());
+        if (error.code() == HostError::Code::kExists)
+            Failure(std::string(error.what()) + "; use --force to replace it");
+        throw;
     }
     std::cout << (existed ? "Replaced" : "Created") << " the simulated host at '" << host.Dir()
               << "' from " << (source.empty() ? "the default scenario" : "'" + source + "'")
@@ -156,12 +158,7 @@ void FaultCommand(Host& host, const std::string& action, Words& words) {
         std::optional<std::int64_t> times;
         if (words.Has("--times")) times = ParseTimes(words.Option("--times"));
         const std::string& operation = words.Positional()[0];
-        if (!IsKnownOperation(operation)) {
-            std::string hint;
-            for (const std::string& near : NearestOperations(operation))
-                hint += (hint.empty() ? "" : ", ") + near;
-            Usage("unknown operation '" + operation + "'; nearest known: " + hint, false);
-        }
+        if (!IsKnownOperation(operation)) Usage(UnknownOperationText(operation), false);
         host.AddFault(operation, words.Positional()[1], times);
     } else if (action == "list") {
         words.Parse({}, {});

@@ -1,33 +1,32 @@
 // The identity domain: what the host is (product, version, build, update) and which machine it
 // is (system UUID, boot NIC, boot file system, stateless boot NIC).
 //
-// Scenario section "identity" (all members required):
-//   product, version   text of 1..31 bytes (product) and 0..31 bytes (version)
-//   build              text of at most 95 bytes
-//   update             text of at most 151 bytes
+// Scenario section "identity" (every member optional; the default host's identity otherwise):
+//   product            text of 1..31 bytes        version   text of at most 31 bytes
+//   build              text of at most 95 bytes   update    text of at most 151 bytes
 //   system_uuid        canonical UUID, 8-4-4-4-12 hexadecimal digits
 //   boot_nic_mac, stateless_boot_nic_mac   "" or six two-digit hexadecimal groups joined by ':'
 //   boot_fs_uuid       "" or at most 63 hexadecimal digits and '-'
-// The limits are those of the product version record, so encoding never truncates.
+// The text limits are those of the product version record (node 1238), so encoding never
+// truncates.
 #pragma once
 
-#include <simhost/Export.h>
+#include <simhost/Mapping.h>
+#include <simhost/State.h>
 
-#include <simhost/Domain.h>
-
-#include <array>
 #include <string>
 
 namespace simhost {
 namespace identity {
 
-constexpr std::size_t kProductMax = 31;
-constexpr std::size_t kVersionMax = 31;
-constexpr std::size_t kBuildMax = 95;
-constexpr std::size_t kUpdateMax = 151;
-constexpr std::size_t kBootFsUuidMax = 63;
+bool IsUuid(const std::string& text);
+bool IsMacOrEmpty(const std::string& text);
+bool IsFsUuidOrEmpty(const std::string& text);
 
 struct Identity {
+    static constexpr char kSection[] = "identity";
+    static constexpr StateKind kKind = StateKind::kSingleton;
+
     std::string product;
     std::string version;
     std::string build;
@@ -36,27 +35,55 @@ struct Identity {
     std::string boot_nic_mac;
     std::string boot_fs_uuid;
     std::string stateless_boot_nic_mac;
+
+    static Identity Default() {
+        return {"Quarn", "8.0.2", "Build 22380479", "1", "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c",
+                "00:50:56:a1:2b:3c", "6523a1f4-5e2d9b70-7c41-0050569a2b3c", ""};
+    }
 };
 
-// Kernel information node 1238: NUL-terminated text at offsets 0 (product), 32 (version),
-// 64 (build) and 160 (update); every other byte zero.
-constexpr int kProductVersionNode = 1238;
-constexpr std::size_t kProductVersionSize = 312;
-constexpr std::size_t kProductOffset = 0;
-constexpr std::size_t kVersionOffset = 32;
-constexpr std::size_t kBuildOffset = 64;
-constexpr std::size_t kUpdateOffset = 160;
+template <class V>
+void Describe(V& v, Identity& s) {
+    const Pattern uuid{IsUuid, "expected a UUID of the form xxxxxxxx-xxxx-xxxx-xxxx-xxxxxxxxxxxx"};
+    const Pattern mac{IsMacOrEmpty, "expected \"\" or a MAC address of the form xx:xx:xx:xx:xx:xx"};
+    v("product", s.product, Text(31, false));
+    v("version", s.version, Text(31));
+    v("build", s.build, Text(95));
+    v("update", s.update, Text(151));
+    v("system_uuid", s.system_uuid, uuid);
+    v("boot_nic_mac", s.boot_nic_mac, mac);
+    v("boot_fs_uuid", s.boot_fs_uuid,
+      Pattern{IsFsUuidOrEmpty, "expected \"\" or at most 63 hexadecimal digits and '-'"});
+    v("stateless_boot_nic_mac", s.stateless_boot_nic_mac, mac);
+}
 
-// Encodes the record; the fields must be within their limits (checked by Check/Parse).
-SIMHOST_API std::array<unsigned char, kProductVersionSize> EncodeProductVersion(const Identity& identity);
+inline bool IsHexDigit(char c) {
+    return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'f') || (c >= 'A' && c <= 'F');
+}
 
-// "" when every field is acceptable, else "MEMBER: reason" for the first one that is not.
-SIMHOST_API std::string Check(const Identity& identity);
+inline bool IsUuid(const std::string& text) {
+    if (text.size() != 36) return false;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        bool dash = i == 8 || i == 13 || i == 18 || i == 23;
+        if (dash ? text[i] != '-' : !IsHexDigit(text[i])) return false;
+    }
+    return true;
+}
 
-// The host's current identity.
-SIMHOST_API Identity Read(Db& db);
+inline bool IsMacOrEmpty(const std::string& text) {
+    if (text.empty()) return true;
+    if (text.size() != 17) return false;
+    for (std::size_t i = 0; i < text.size(); ++i)
+        if (i % 3 == 2 ? text[i] != ':' : !IsHexDigit(text[i])) return false;
+    return true;
+}
 
-SIMHOST_API const Domain& TheDomain();
+inline bool IsFsUuidOrEmpty(const std::string& text) {
+    if (text.size() > 63) return false;
+    for (char c : text)
+        if (!IsHexDigit(c) && c != '-') return false;
+    return true;
+}
 
 }  // namespace identity
 }  // namespace simhost

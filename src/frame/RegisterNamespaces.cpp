@@ -6,6 +6,7 @@
 // precedes its children, so children end up attached in table order. When the function returns,
 // the framework owns the tree; nothing here keeps a reference.
 #include "frame/CommandModel.h"
+#include "frame/Export.h"
 #include "identity/BootDeviceGet.h"
 #include "identity/UuidGet.h"
 #include "identity/VersionGet.h"
@@ -74,7 +75,7 @@ const TreeRow kTree[] = {
 }  // namespace System
 }  // namespace TarselCli
 
-extern "C" __attribute__((visibility("default"))) void AutoCli_RegisterNamespaces(
+extern "C" SYSTEM_EXPORT void AutoCli_RegisterNamespaces(
     boost::shared_ptr<Kitbase::AutoCli::NamespaceNode> root) {
     using namespace TarselCli::System;
     std::map<std::string, NodePtr> nodes;

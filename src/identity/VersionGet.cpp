@@ -2,18 +2,14 @@
 
 #include "frame/Record.h"
 
+#include <norlithctl/Records.h>
 #include <norlithctl/Sysinfo.h>
 
 namespace TarselCli {
 namespace System {
 
 namespace {
-const int kVersionNode = 1238;
-const std::size_t kVersionRecordSize = 312;
-const std::size_t kProductOffset = 0;
-const std::size_t kVersionOffset = 32;
-const std::size_t kBuildOffset = 64;
-const std::size_t kUpdateOffset = 160;
+typedef NorlithCtl::Util::Records::ProductVersion Layout;
 }  // namespace
 
 boost::shared_ptr<VersionGet> VersionGet::New() {
@@ -44,13 +40,13 @@ void VersionGet::ExecuteInternal(const InputPtr&, const OutputPtr& output) {
         output,
         [&] {
             StructPtr result = MetaObj::MetaStruct::New("VersionGet");
-            NorlithCtl::Util::Sysinfo info(kVersionNode);
-            char record[kVersionRecordSize];
+            NorlithCtl::Util::Sysinfo info(Layout::kNode);
+            char record[Layout::kSize];
             info.Get(record, sizeof record);
-            result->SetField("Build", RecordText(record, sizeof record, kBuildOffset));
-            result->SetField("Version", RecordText(record, sizeof record, kVersionOffset));
-            result->SetField("Product", RecordText(record, sizeof record, kProductOffset));
-            result->SetField("Update", RecordText(record, sizeof record, kUpdateOffset));
+            result->SetField("Build", RecordText(record, sizeof record, Layout::kBuild));
+            result->SetField("Version", RecordText(record, sizeof record, Layout::kVersion));
+            result->SetField("Product", RecordText(record, sizeof record, Layout::kProduct));
+            result->SetField("Update", RecordText(record, sizeof record, Layout::kUpdate));
             SetResult(output, result);
         },
         0, "Unable to query product version: ");

@@ -30,7 +30,11 @@ const std::string kGetBootFs = "NorlithCtl::System::SystemInfoImpl::GetBootFsUUI
 const std::string kGetStateless =
     "NorlithCtl::System::SystemInfoImpl::GetStatelessBootNicMacAddress";
 
-nlohmann::json DefaultHost() { return nlohmann::json::parse(simhost::DefaultScenario()); }
+// The default host's state as an export shows it.
+nlohmann::json DefaultHost() {
+    simhost::TempHost temp;
+    return nlohmann::json::parse(temp.host().Export());
+}
 
 OutputPtr Execute(const boost::shared_ptr<AutoCli::Command>& command) {
     OutputPtr output = CallSpec::Output::New();

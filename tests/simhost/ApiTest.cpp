@@ -4,6 +4,7 @@
 
 #include <norlithctl/QuillUserLib.h>
 #include <norlithctl/RavelException.h>
+#include <norlithctl/Records.h>
 #include <norlithctl/Sysinfo.h>
 #include <norlithctl/SystemInfoImpl.h>
 
@@ -20,6 +21,7 @@ using Ravel::Lib::RavelException;
 
 const std::string kInfo = "NorlithCtl::System::SystemInfoImpl::";
 const std::string kSysinfo = "NorlithCtl::Util::Sysinfo::";
+const int kVersionNode = NorlithCtl::Util::Records::ProductVersion::kNode;
 
 // The message of the RavelException body throws, or "" when it returns.
 template <class Body>
@@ -81,9 +83,9 @@ TEST_F(ApiTest, ConstructorsFault) {
     host_.host().AddFault(kInfo + "SystemInfoImpl", "no system info", 1);
     host_.host().AddFault(kSysinfo + "Sysinfo", "no kernel info", 1);
     EXPECT_EQ(Failure([] { SystemInfoImpl info; }), "no system info");
-    EXPECT_EQ(Failure([] { Sysinfo node(Sysinfo::ProductVersion); }), "no kernel info");
+    EXPECT_EQ(Failure([] { Sysinfo node(kVersionNode); }), "no kernel info");
     EXPECT_EQ(Failure([] { SystemInfoImpl info; }), "");
-    EXPECT_EQ(Failure([] { Sysinfo node(Sysinfo::ProductVersion); }), "");
+    EXPECT_EQ(Failure([] { Sysinfo node(kVersionNode); }), "");
 }
 
 TEST_F(ApiTest, AddingAFaultRefusesWhatCannotBeRaised) {
@@ -114,11 +116,23 @@ TEST_F(ApiTest, RavelExceptionFormsItsMessage) {
     EXPECT_EQ(plain.GetMessage(0), "Unable to open");
     EXPECT_EQ(plain.GetMessage(1), "Unable to open");
     EXPECT_STREQ(plain.what(), "Unable to open");
-    RavelException detailed("Unable to open",
-                            Ravel::Lib::QuillMessage("quill.io.open", {"/etc/x", "busy"}));
+    // Form 1 is the text of the event record: the catalog's text with the arguments filled in.
+    RavelException detailed("Unable to open", Ravel::Lib::QuillMessage("quill.host.operation.failed",
+                                                                       {"open /etc/x", "busy"}));
     EXPECT_EQ(detailed.GetMessage(0), "Unable to open");
-    EXPECT_EQ(detailed.GetMessage(1), "Unable to open [quill.io.open: /etc/x, busy]");
-    EXPECT_EQ(detailed.GetQuillMessage().GetArgs().size(), 2u);
+    EXPECT_EQ(detailed.GetMessage(1), "The operation open /etc/x failed: busy");
+    RavelException unknown("Unable to open", Ravel::Lib::QuillMessage("quill.io.open", {"/etc/x"}));
+    EXPECT_EQ(unknown.GetMessage(1), "quill.io.open(/etc/x)");
+    // A fault with an event hands it on.
+    host_.host().AddFault(kInfo + "GetSystemUuid", "plain text", 1,
+                          simhost::Event{"quill.host.unavailable", {"maintenance"}});
+    try {
+        SystemInfoImpl().GetSystemUuid();
+        FAIL();
+    } catch (const RavelException& error) {
+        EXPECT_EQ(error.GetMessage(0), "plain text");
+        EXPECT_EQ(error.GetMessage(1), "The host is not available: maintenance");
+    }
     // Thrown inside the library, it is caught by its type and as std::exception.
     host_.host().AddFault(kInfo + "GetBootFsUUID", "boom");
     SystemInfoImpl info;
@@ -141,7 +155,7 @@ TEST_F(ApiTest, JournalRecordsChangesAndFaultsButNotReads) {
     ASSERT_EQ(QuillUserLib_AddQuill("%s went %s", "vmnic0", "down"), 0);
     host_.host().AddFault(kSysinfo + "Get", "node busy", 1);
     char record[312];
-    Sysinfo node(Sysinfo::ProductVersion);
+    Sysinfo node(kVersionNode);
     EXPECT_EQ(Failure([&] { node.Get(record, sizeof record); }), "node busy");
     QuillUserLib_Close();
 
@@ -163,7 +177,7 @@ TEST_F(ApiTest, JournalRecordsChangesAndFaultsButNotReads) {
 
 TEST_F(ApiTest, SecretArgumentsNeverReachTheJournal) {
     {
-        simhost::Call call("test::SetPassword",
+        simhost::Call call(simhost::Op::SystemInfoImpl_New,
                            simhost::Args().Add("user", "root").Secret("password"));
         call.Change([](simhost::Db&) {});
     }
@@ -179,7 +193,7 @@ TEST_F(ApiTest, TraceListsEveryCallInOrder) {
         SystemInfoImpl info;
         info.GetSystemUuid();
         Failure([&] { info.GetBootFsUUID(); });
-        Sysinfo node(Sysinfo::ProductVersion);
+        Sysinfo node(kVersionNode);
         char record[312];
         node.Get(record, sizeof record);
     }
@@ -208,7 +222,7 @@ TEST_F(ApiTest, EveryOperationTheLibrariesCallIsRegistered) {
         info.GetBootNicMacAddress();
         info.GetBootFsUUID();
         info.GetStatelessBootNicMacAddress();
-        Sysinfo node(Sysinfo::ProductVersion);
+        Sysinfo node(kVersionNode);
         char record[312];
         node.Get(record, sizeof record);
         std::vector<std::string> names;

@@ -59,15 +59,15 @@ TEST_F(QuarnhostTest, InitCreatesRefusesAndReplaces) {
     ProcessResult created = Run({"init", "--scenario", simtest::ScenarioFile("no-netboot.json")});
     EXPECT_EQ(created.status, 0) << created.err;
     EXPECT_NE(created.out.find("Created"), std::string::npos);
-    EXPECT_EQ(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json"))));
 
     ExpectRefusal({"init"}, 1, "already exists at '" + state_ + "'; use --force");
-    EXPECT_EQ(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json"))));
 
     ProcessResult replaced = Run({"init", "--force"});
     EXPECT_EQ(replaced.status, 0) << replaced.err;
     EXPECT_NE(replaced.out.find("Replaced"), std::string::npos);
-    EXPECT_EQ(Export(), simhost::DefaultScenario());
+    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
 }
 
 TEST_F(QuarnhostTest, ABadScenarioFileIsRefusedWithItsLocation) {
@@ -84,7 +84,7 @@ TEST_F(QuarnhostTest, ABadScenarioFileIsRefusedWithItsLocation) {
 }
 
 TEST_F(QuarnhostTest, ExportCreatesTheDefaultHostOnFirstUse) {
-    EXPECT_EQ(Export(), simhost::DefaultScenario());
+    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
     EXPECT_TRUE(std::filesystem::is_directory(state_ + "/root"));
 }
 
@@ -153,7 +153,7 @@ TEST_F(QuarnhostTest, UsageErrorsExitWithTwo) {
     for (const char* times : {"0", "-1", "abc", "1e3", "2.5", "1000000001", "99999999999999999999"})
         ExpectRefusal({"fault", "add", kGetUuid, "m", "--times", times}, 2, "--times expects");
     ExpectRefusal({"fault", "add", "SystemInfoImpl::GetSystemUUID", "m"}, 2,
-                  "unknown operation 'SystemInfoImpl::GetSystemUUID'; nearest known: " + kGetUuid);
+                  "unknown operation 'SystemInfoImpl::GetSystemUUID' (nearest: " + kGetUuid);
     ProcessResult no_state = RunQuarnhost({"--state"});
     EXPECT_EQ(no_state.status, 2);
     EXPECT_NE(no_state.err.find("'--state' needs a value"), std::string::npos);

@@ -2,9 +2,11 @@
 #include "TestSupport.h"
 
 #include <norlithctl/RavelException.h>
+#include <norlithctl/Records.h>
 #include <norlithctl/Sysinfo.h>
 
 #include <simhost/Host.h>
+#include <simhost/Records.h>
 #include <simhost/domains/Identity.h>
 
 #include <gtest/gtest.h>
@@ -16,11 +18,14 @@ namespace {
 using NorlithCtl::Util::Sysinfo;
 using simhost::identity::Identity;
 
-struct Field {
-    std::size_t offset;
-    std::size_t width;  // bytes reserved, terminating NUL included
-};
-const Field kFields[] = {{0, 32}, {32, 32}, {64, 96}, {160, 152}};
+using NorlithCtl::Util::Records::Field;
+using Layout = NorlithCtl::Util::Records::ProductVersion;
+// The layout's fields, checked against the byte positions the commands rely on.
+const Field kFields[] = {Layout::kProduct, Layout::kVersion, Layout::kBuild, Layout::kUpdate};
+static_assert(Layout::kProduct.offset == 0 && Layout::kVersion.offset == 32 &&
+                  Layout::kBuild.offset == 64 && Layout::kUpdate.offset == 160 &&
+                  Layout::kSize == 312,
+              "the product version record's layout");
 
 std::string TextAt(const unsigned char* record, std::size_t offset) {
     return reinterpret_cast<const char*>(record + offset);
@@ -37,7 +42,7 @@ Identity Sample() {
 }
 
 TEST(ProductVersionRecord, PutsEachFieldAtItsOffsetAndZeroesTheRest) {
-    auto record = simhost::identity::EncodeProductVersion(Sample());
+    auto record = simhost::EncodeProductVersion(Sample());
     ASSERT_EQ(record.size(), 312u);
     EXPECT_EQ(TextAt(record.data(), 0), "Quarn");
     EXPECT_EQ(TextAt(record.data(), 32), "8.0.2");
@@ -61,8 +66,8 @@ TEST(ProductVersionRecord, FieldsAtTheirLimitsKeepTheirTerminatingNul) {
     identity.version = std::string(31, 'v');
     identity.build = std::string(95, 'b');
     identity.update = std::string(151, 'u');
-    EXPECT_EQ(simhost::identity::Check(identity), "");
-    auto record = simhost::identity::EncodeProductVersion(identity);
+    EXPECT_EQ(simhost::Verify(identity), "");
+    auto record = simhost::EncodeProductVersion(identity);
     const char letters[] = {'p', 'v', 'b', 'u'};
     for (int f = 0; f < 4; ++f) {
         const Field& field = kFields[f];
@@ -71,11 +76,11 @@ TEST(ProductVersionRecord, FieldsAtTheirLimitsKeepTheirTerminatingNul) {
         EXPECT_EQ(record[field.offset + field.width - 1], 0) << "field " << f;
     }
     identity.update.push_back('u');
-    EXPECT_EQ(simhost::identity::Check(identity),
+    EXPECT_EQ(simhost::Verify(identity),
               "update: expected a string of at most 151 bytes");
     identity = Sample();
     identity.product = "";
-    EXPECT_NE(simhost::identity::Check(identity), "");
+    EXPECT_NE(simhost::Verify(identity), "");
 }
 
 class SysinfoTest : public ::testing::Test {
@@ -86,7 +91,7 @@ protected:
 TEST_F(SysinfoTest, GetEncodesTheHostsCurrentIdentity) {
     unsigned char record[312];
     std::memset(record, 0xAA, sizeof record);
-    Sysinfo node(Sysinfo::ProductVersion);
+    Sysinfo node(Layout::kNode);
     EXPECT_EQ(node.GetNode(), 1238);
     node.Get(record, sizeof record);
     EXPECT_EQ(TextAt(record, 0), "Quarn");
@@ -108,7 +113,7 @@ TEST_F(SysinfoTest, GetEncodesTheHostsCurrentIdentity) {
 }
 
 TEST_F(SysinfoTest, RefusesWrongSizesUnknownNodesAndInstances) {
-    Sysinfo node(Sysinfo::ProductVersion);
+    Sysinfo node(Layout::kNode);
     std::vector<unsigned char> buffer(400, 0x55);
     for (std::size_t size : {0, 311, 313}) {
         try {

@@ -12,6 +12,20 @@ std::string EditedDefault(const std::string& pointer, const nlohmann::json& valu
     return document.dump();
 }
 
+namespace {
+bool HoldsJson(const nlohmann::json& state, const nlohmann::json& wanted) {
+    if (!wanted.is_object()) return state == wanted;
+    if (!state.is_object()) return false;
+    for (auto it = wanted.begin(); it != wanted.end(); ++it)
+        if (!state.contains(it.key()) || !HoldsJson(state[it.key()], it.value())) return false;
+    return true;
+}
+}  // namespace
+
+bool Holds(const std::string& exported, const std::string& scenario) {
+    return HoldsJson(nlohmann::json::parse(exported), nlohmann::json::parse(scenario));
+}
+
 testsupport::ProcessResult RunQuarnhost(
     const std::vector<std::string>& args,
     const std::map<std::string, std::optional<std::string>>& env) {

@@ -21,6 +21,11 @@ std::string ScenarioFile(const std::string& name);  // path under scenarios/
 // The default scenario with one JSON pointer replaced (e.g. "/identity/product").
 std::string EditedDefault(const std::string& pointer, const nlohmann::json& value);
 
+// Whether an exported host holds what a scenario says: every member the scenario gives (at any
+// depth of objects) has the same value in the export. What the scenario leaves out is the
+// domains' defaults and is not compared.
+bool Holds(const std::string& exported, const std::string& scenario);
+
 // Runs quarnhost with the arguments; env entries are set in the child (a nullopt value unsets).
 testsupport::ProcessResult RunQuarnhost(
     const std::vector<std::string>& args,

@@ -1,0 +1,34 @@
+// The files domain: the host's own files under root/, as a scenario section.
+//
+// Scenario section "files" (default []): an array of entries, each naming a path the host sees
+// (absolute, normalised: no "." or ".." components, no doubled or trailing "/", components of at
+// most 255 bytes, the whole at most 4095 bytes):
+//   {"path": "/etc/motd", "text": "...", "mode": "0644"}      a regular file with UTF-8 text
+//   {"path": "/x.bin", "base64": "...", "size": 1048576}      a file with any bytes
+//   {"path": "/mnt/data", "type": "directory", "mode": "0755"}
+//   {"path": "/lib/link", "type": "symlink", "target": "../x"}
+// "mode" is an octal text of at most 4 digits (default 0644 for files, 0755 for directories);
+// "size", when given, is the file's length (at least its content's; the rest reads as zeros and
+// is not stored, so pre-allocated files stay sparse). Directories above an entry are created as
+// needed. An export lists every file and symbolic link, and the empty directories, sorted by
+// path, with text when the content is UTF-8 without NUL and base64 otherwise; a file's content
+// ends at its last nonzero byte and "size" gives the rest.
+#pragma once
+
+#include <simhost/State.h>
+
+namespace simhost {
+namespace files {
+
+// Marks the custom domain in Registry.def; its state lives in root/, not in the database.
+struct Tree {
+    static constexpr char kSection[] = "files";
+    static constexpr StateKind kKind = StateKind::kCustom;
+    static const Domain& TheDomain();
+};
+
+// Whether path is a normalised absolute host path as the section requires.
+SIMHOST_API bool IsNormalPath(const std::string& path);
+
+}  // namespace files
+}  // namespace simhost
