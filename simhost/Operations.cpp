@@ -1,5 +1,7 @@
 #include <simhost/Operations.h>
 
+#include <simhost/Events.h>
+
 #include <algorithm>
 #include <numeric>
 
@@ -93,7 +95,8 @@ std::string OperationsMarkdown() {
         "# Host operations\n\n"
         "Every operation the host-control and event libraries serve. Each can be made to fail\n"
         "with `quarnhost fault add NAME MESSAGE`; the journal and the call trace name them so.\n"
-        "This page is generated from simhost/Registry.def by `quarnhost operations`.\n";
+        "This page is generated from simhost/Registry.def by `quarnhost operations`; a test keeps it\n"
+        "current.\n";
     std::string current = "\x01";
     for (const OperationInfo& info : kOperations) {
         std::string owner = ClassOf(info.name);
@@ -104,6 +107,13 @@ std::string OperationsMarkdown() {
         }
         text += std::string("| `") + info.name + "` | " + info.doc + " |\n";
     }
+    text +=
+        "\n# Events\n\n"
+        "The event catalog: the events a host error's event record (its `QuillMessage`) may name,\n"
+        "with the text `GetMessage(1)` forms from them. A fault may carry one: `quarnhost fault add\n"
+        "NAME MESSAGE --event ID [--arg TEXT]...`.\n\n| event | text |\n|---|---|\n";
+    for (const EventInfo& event : EventCatalog())
+        text += std::string("| `") + event.id + "` | " + event.text + " |\n";
     return text;
 }
 

@@ -40,8 +40,8 @@ SIMHOST_API std::vector<std::string> NearestOperations(const std::string& name, 
 // "unknown operation 'NAME' (nearest: A, B, C)", for refusals.
 SIMHOST_API std::string UnknownOperationText(const std::string& name);
 
-// The operation list as Markdown: one section per class, one row per operation. quarnhost
-// prints it and docs/operations.md is this text.
+// The operation list and the event catalog as Markdown: one section per class, one row per
+// operation, then the events. quarnhost prints it and docs/operations.md is this text.
 SIMHOST_API std::string OperationsMarkdown();
 
 }  // namespace simhost

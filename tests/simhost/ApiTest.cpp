@@ -262,3 +262,18 @@ TEST_F(ApiTest, EventLibraryPostsToTheObservationLog) {
 }
 
 }  // namespace
+
+namespace {
+
+// docs/operations.md is generated from the registry; it must say what this build serves.
+TEST(OperationList, TheDocsListEveryOperationAndEvent) {
+    const std::string path = std::string(SCENARIO_DIR) + "/../docs/operations.md";
+    const char* update = std::getenv("QUARN_UPDATE_GOLDEN");
+    if (update && std::string(update) == "1") testsupport::WriteFile(path, simhost::OperationsMarkdown());
+    EXPECT_EQ(testsupport::ReadFile(path), simhost::OperationsMarkdown())
+        << "docs/operations.md is out of date; QUARN_UPDATE_GOLDEN=1 rewrites it";
+    for (const simhost::OperationInfo& info : simhost::Operations())
+        EXPECT_EQ(simhost::FindOperation(info.name), info.op) << info.name << " is declared twice";
+}
+
+}  // namespace
