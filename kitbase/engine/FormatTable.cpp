@@ -247,10 +247,53 @@ private:
             widths_ = Share(words, room);
             return;
         }
+        std::vector<std::size_t> natural = widths_;
         std::vector<std::size_t> more(count);
         for (std::size_t c = 0; c < count; ++c) more[c] = widths_[c] - words[c];
         std::vector<std::size_t> extra = Share(more, room - needed);
         for (std::size_t c = 0; c < count; ++c) widths_[c] = words[c] + extra[c];
+        Tighten(grid, natural);
+    }
+
+    // A narrowed column whose wrapped cells leave part of it blank on every line gives that
+    // part to the narrowed columns that can still use it.
+    void Tighten(Grid& grid, const std::vector<std::size_t>& natural) {
+        const std::size_t count = widths_.size();
+        std::vector<std::size_t> used(count, 0);
+        auto measure = [&](std::size_t c, const std::string& text) {
+            Segments segments(text, widths_[c]);
+            const char* data;
+            std::size_t size;
+            while (segments.Next(&data, &size)) used[c] = std::max(used[c], DisplayWidth(data, size));
+        };
+        if (header_) {
+            for (std::size_t c = 0; c < count; ++c) {
+                if (widths_[c] < natural[c]) measure(c, headings_[c]);
+            }
+        }
+        for (std::size_t r = 0; r < grid.rows.size(); ++r) {
+            grid.columns.Map(*grid.rows[r]);
+            const std::vector<const MetaObject*>& cells = grid.columns.Cells();
+            for (std::size_t c = 0; c < count; ++c) {
+                if (widths_[c] >= natural[c]) continue;
+                line_.clear();
+                AppendShown(line_, cells[c], scratch_);
+                measure(c, line_);
+            }
+        }
+        std::size_t slack = 0;
+        std::vector<std::size_t> caps(count, 0);
+        for (std::size_t c = 0; c < count; ++c) {
+            if (widths_[c] >= natural[c]) continue;
+            if (used[c] < widths_[c]) {
+                slack += widths_[c] - std::max<std::size_t>(used[c], 1);
+                widths_[c] = std::max<std::size_t>(used[c], 1);
+            } else {
+                caps[c] = natural[c] - widths_[c];
+            }
+        }
+        std::vector<std::size_t> extra = Share(caps, slack);
+        for (std::size_t c = 0; c < count; ++c) widths_[c] += extra[c];
     }
 
     // Per column: the widest word of its cells and heading (never more than the column).
