@@ -163,13 +163,21 @@ std::size_t EscapeAt(const unsigned char* p, std::size_t left, Backslash backsla
 
 }  // namespace
 
+// Bytes that are kept without a closer look: printable ASCII (the backslash apart).
+struct PlainBytes {
+    bool plain[256];
+    PlainBytes() {
+        for (int c = 0; c < 256; ++c) plain[c] = c >= 0x20 && c < 0x7f && c != '\\';
+    }
+};
+const PlainBytes kPlain;
+
 bool NeedsEscape(const char* text, std::size_t size, Backslash backslash) {
     const unsigned char* p = reinterpret_cast<const unsigned char*>(text);
     char escape[8];
     std::size_t i = 0;
     while (i < size) {
-        unsigned char c = p[i];
-        if (c >= 0x20 && c < 0x7f && (c != '\\' || backslash == Backslash::kKeep)) {
+        if (kPlain.plain[p[i]]) {
             ++i;
             continue;
         }
@@ -186,6 +194,10 @@ void EscapeTo(std::string& out, const char* text, std::size_t size, Backslash ba
     std::size_t run = 0;  // start of the pending run of bytes kept as they are
     std::size_t i = 0;
     while (i < size) {
+        if (kPlain.plain[p[i]]) {
+            ++i;
+            continue;
+        }
         std::size_t covers;
         std::size_t length = EscapeAt(p + i, size - i, backslash, escape, &covers);
         if (length == 0) {

@@ -83,16 +83,17 @@ private:
             }
             return;
         }
-        PutEscaped(out_, key, true);
+        PutEscaped(out_, key, true, escaped_);
         out_.Put('=');
         scratch_.clear();
         AppendText(scratch_, value);
-        PutEscaped(out_, scratch_, true);
+        PutEscaped(out_, scratch_, true, escaped_);
         out_.Put('\n');
     }
 
     Writer& out_;
     std::string scratch_;
+    std::string escaped_;
 };
 
 }  // namespace

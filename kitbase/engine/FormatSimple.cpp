@@ -109,7 +109,7 @@ private:
         AppendText(scratch_, value);
         if (!scratch_.empty()) {
             out_.Put(' ');
-            PutEscaped(out_, scratch_);
+            PutEscaped(out_, scratch_, false, escaped_);
             const std::string* unit = params_.Unit(structName, fieldName);
             if (unit != nullptr && value->GetType() != MetaObj::MetaTypeList) {
                 out_.Put(' ');
@@ -124,6 +124,7 @@ private:
     std::map<std::string, Columns> columns_;
     std::map<std::string, const MetaStruct*> templates_;
     std::string scratch_;
+    std::string escaped_;
 };
 
 }  // namespace

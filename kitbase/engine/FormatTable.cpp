@@ -13,6 +13,8 @@
 
 #include "engine/Text.h"
 
+#include "util/Text.h"
+
 #include <algorithm>
 #include <numeric>
 
@@ -337,10 +339,27 @@ private:
     }
 
     void Cell(std::size_t column, const MetaObject* value) {
-        std::size_t w = TextWidth(value, scratch_);
-        if (w > 0) {
-            Gap();
-            PutText(out_, value, scratch_);
+        std::size_t w;
+        if (value != nullptr && value->GetType() == MetaObj::MetaTypeString) {
+            // Escaped once, measured and written from the same text.
+            const std::string& text = static_cast<const MetaString*>(value)->GetValue();
+            const std::string* shown = &text;
+            if (quarn::util::NeedsEscape(text.data(), text.size())) {
+                scratch_.clear();
+                quarn::util::EscapeTo(scratch_, text.data(), text.size());
+                shown = &scratch_;
+            }
+            w = value->HasValue() ? DisplayWidth(*shown) : 0;
+            if (w > 0) {
+                Gap();
+                out_.Put(*shown);
+            }
+        } else {
+            w = TextWidth(value, scratch_);
+            if (w > 0) {
+                Gap();
+                PutText(out_, value, scratch_);
+            }
         }
         pending_ += widths_[column] - w + kGap;
     }

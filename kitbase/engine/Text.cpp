@@ -271,6 +271,19 @@ void PutEscaped(Writer& out, const char* text, std::size_t size, bool escapeBack
     out.Put(escaped);
 }
 
+void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash,
+                std::string& scratch) {
+    quarn::util::Backslash backslash =
+        escapeBackslash ? quarn::util::Backslash::kEscape : quarn::util::Backslash::kKeep;
+    if (!quarn::util::NeedsEscape(text.data(), text.size(), backslash)) {
+        out.Put(text);
+        return;
+    }
+    scratch.clear();
+    quarn::util::EscapeTo(scratch, text.data(), text.size(), backslash);
+    out.Put(scratch);
+}
+
 std::size_t EscapedWidth(const char* text, std::size_t size) {
     if (!quarn::util::NeedsEscape(text, size)) return DisplayWidth(text, size);
     std::string escaped;

@@ -58,6 +58,10 @@ KITBASE_API void PutEscaped(Writer& out, const char* text, std::size_t size,
 inline void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash = false) {
     PutEscaped(out, text.data(), text.size(), escapeBackslash);
 }
+// The same, escaping through scratch (reused between calls, so a long run of cells that need
+// escaping costs no allocation each).
+KITBASE_API void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash,
+                            std::string& scratch);
 // Columns that text takes once escaped.
 KITBASE_API std::size_t EscapedWidth(const char* text, std::size_t size);
 // The text escaped, as a string (for messages).
