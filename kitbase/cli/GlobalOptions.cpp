@@ -134,7 +134,8 @@ const std::vector<GlobalOptionInfo>& GlobalOptionTable() {
         {"--schema", nullptr, nullptr, "Print the command tree below the given words as JSON.",
          true, SetSchema},
         {"--help", "-h", nullptr, "Show help for the given words.", false, SetHelp},
-        {"--version", nullptr, nullptr, "Show the program's version.", false, SetVersion},
+        {"--version", nullptr, nullptr,
+         "Show the program's version (before the command words only).", false, SetVersion},
     };
     return table;
 }
