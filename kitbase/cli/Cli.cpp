@@ -1,7 +1,7 @@
 // quarncli: from the command line to an exit status. The run's steps live in their own files:
-// global options (GlobalOptions), plug-in loading (PluginSet), the command words (Resolve),
-// namespace listings (Listing), running a command (CommandRun) and where output and messages
-// go (Console). The session below only puts them in order.
+// global options (GlobalOptions), the tree and its plug-ins (Tree, PluginSet), the command
+// words (Resolve), namespace listings (Listing), running a command (CommandRun) and where output
+// and messages go (Console). The session below only puts them in order.
 #include "cli/Cli.h"
 
 #include "cli/CommandRun.h"
@@ -9,7 +9,7 @@
 #include "cli/GlobalOptions.h"
 #include "cli/Guard.h"
 #include "cli/Listing.h"
-#include "cli/PluginSet.h"
+#include "cli/Tree.h"
 #include "cli/Resolve.h"
 #include "engine/Schema.h"
 #include "engine/Text.h"
@@ -18,7 +18,6 @@
 #include <kitbase/AutoCli.h>
 #include <kitbase/CallSpec.h>
 
-#include <cstdlib>
 #include <memory>
 #include <unistd.h>
 
@@ -30,29 +29,12 @@ const char kVersion[] = "1.0.0";
 
 namespace {
 
-typedef boost::shared_ptr<AutoCli::NamespaceNode> NodePtr;
-
-const char kHostStateVariable[] = "QUARN_HOST_STATE";
-
-// The plug-ins and the tree they built, from one plug-in directory and host state.
-struct Loaded {
-    // Declared before the tree: destroyed after it, so no node outlives its plug-in's code.
-    PluginSet plugins;
-    NodePtr root;
-    std::string pluginDir;
-    bool pluginDirSet = false;
-    std::string hostState;
-    bool hostStateSet = false;
-};
-
 class Session {
 public:
     Session(const std::vector<std::string>& args, int outFd, int errFd,
             const RunSettings& settings)
-        : args_(args), console_(outFd, errFd), settings_(settings) {
-        const char* state = std::getenv(kHostStateVariable);
-        if (state != nullptr) originalHostState_.reset(new std::string(state));
-    }
+        : args_(args), console_(outFd, errFd), settings_(settings),
+          hostStateBefore_(HostStateBefore::Read()) {}
 
     int Run() {
         std::size_t next = 0;
@@ -76,7 +58,7 @@ public:
                   &early);
         int status = kExitOk;
         if (!Load(early, &status)) return status;
-        if (!Resolve(loaded_->root, words_, &resolved_, &error)) return Usage(error);
+        if (!Resolve(tree_->root, words_, &resolved_, &error)) return Usage(error);
         return Dispatch();
     }
 
@@ -88,48 +70,11 @@ private:
         return console_.Finish(kExitUsage);
     }
 
-    // Loads the plug-ins for the given settings (host state first: plug-ins may read it while
-    // registering). False with *status set when the run ends here.
+    // Builds the tree for settings; false with *status set when the run ends here.
     bool Load(const GlobalOptions& settings, int* status) {
-        loaded_.reset();
-        std::unique_ptr<Loaded> loaded(new Loaded);
-        loaded->pluginDirSet = settings.pluginDirSet;
-        loaded->hostStateSet = settings.hostStateSet;
-        loaded->hostState = settings.hostState;
-        if (settings.hostStateSet) {
-            setenv(kHostStateVariable, settings.hostState.c_str(), 1);
-        } else if (originalHostState_) {
-            setenv(kHostStateVariable, originalHostState_->c_str(), 1);
-        } else {
-            unsetenv(kHostStateVariable);
-        }
-        std::string error;
-        if (settings.pluginDirSet) {
-            loaded->pluginDir = settings.pluginDir;
-        } else if (!DefaultPluginDir(settings_.exeLink, &loaded->pluginDir, &error)) {
-            console_.Error(error);
-            *status = console_.Finish(kExitFailed);
-            return false;
-        }
-        std::vector<std::string> problems;
-        loaded->root = AutoCli::Namespace::New();
-        bool ok = loaded->plugins.LoadDirectory(loaded->pluginDir, loaded->root, &problems, &error);
-        for (const std::string& problem : problems) console_.Error(problem);
-        if (!ok) {
-            console_.Error(error);
-            *status = console_.Finish(settings.pluginDirSet ? kExitUsage : kExitFailed);
-            return false;
-        }
-        loaded_ = std::move(loaded);
-        return true;
-    }
-
-    // Whether the tree was built with the plug-in directory and host state options_ now holds.
-    bool LoadedMatches() const {
-        if (options_.pluginDirSet != loaded_->pluginDirSet) return false;
-        if (options_.pluginDirSet && options_.pluginDir != loaded_->pluginDir) return false;
-        if (options_.hostStateSet != loaded_->hostStateSet) return false;
-        return !options_.hostStateSet || loaded_->hostState == options_.hostState;
+        tree_.reset();
+        tree_ = BuildTree(settings, hostStateBefore_, settings_.exeLink, console_, status);
+        return tree_ != nullptr;
     }
 
     // mayReload: whether the tree may still be built again (once at most).
@@ -163,7 +108,7 @@ private:
         if (!TakeTrailing(resolved_.rest, spec.get(), &options_, &remaining, &error)) {
             return Usage(error);
         }
-        if (mayReload && !LoadedMatches()) {
+        if (mayReload && !tree_->BuiltFor(options_)) {
             // The command declares --plugin-dir or --host-state itself: the tree is built
             // again without the values read for them after the path.
             options_ = leading;
@@ -172,7 +117,7 @@ private:
             resolved_ = Resolved();
             int status = kExitOk;
             if (!Load(options_, &status)) return status;
-            if (!Resolve(loaded_->root, words_, &resolved_, &error)) return Usage(error);
+            if (!Resolve(tree_->root, words_, &resolved_, &error)) return Usage(error);
             return Dispatch(false);
         }
         if (options_.schema) return Schema(remaining);
@@ -213,10 +158,10 @@ private:
     const std::vector<std::string>& args_;
     Console console_;
     RunSettings settings_;
-    std::unique_ptr<std::string> originalHostState_;
+    HostStateBefore hostStateBefore_;
     GlobalOptions options_;
     std::vector<std::string> words_;  // the arguments after the leading global options
-    std::unique_ptr<Loaded> loaded_;
+    std::unique_ptr<Tree> tree_;
     Resolved resolved_;
 };
 
