@@ -1,10 +1,14 @@
-// libFuzzer target over the command-option parser.
+// libFuzzer target over quarncli's option parsing: the global options before the path, the
+// global options taken from after it, and the command-option parser.
 //
 // The first byte picks one of a few parameter lists (every kind with range and regex
 // constraints and required parameters; one that claims -h; one without parameters); the rest,
-// split at NUL bytes, is the argument list. Whatever the words, the parser must answer with
-// exactly one outcome: accepted (every given parameter readable), help, or a single-line
-// refusal. Run by hand:  build-fw-clang/bin/fuzz_option_parser -max_total_time=60
+// split at NUL bytes, is the argument list. Whatever the words, each parser must answer with
+// exactly one outcome: accepted (every given parameter readable), help, or a refusal of one
+// line with no control character in it (user text in it is escaped). Taking the global options
+// out of the words keeps the others in order. Run by hand:
+//   build-clang/bin/fuzz_option_parser -max_total_time=60
+#include "cli/GlobalOptions.h"
 #include "engine/OptionParser.h"
 
 #include <kitbase/CallSpec.h>
@@ -53,6 +57,40 @@ std::vector<boost::shared_ptr<InputSpec> > Specs() {
     return specs;
 }
 
+// A refusal is one printable line: user text in it is escaped.
+void CheckRefusal(const std::string& message) {
+    if (message.empty()) abort();
+    for (unsigned char c : message) {
+        if (c < 0x20 || c == 0x7f) abort();
+    }
+}
+
+// The global options before and after the path.
+void CheckGlobalOptions(const InputSpec& spec, const std::vector<std::string>& args) {
+    Kitbase::Cli::GlobalOptions options;
+    std::size_t next = 0;
+    std::string error;
+    if (!Kitbase::Cli::ParseLeading(args, &next, &options, &error)) {
+        CheckRefusal(error);
+    } else if (next > args.size()) {
+        abort();
+    }
+    Kitbase::Cli::GlobalOptions trailing;
+    std::vector<std::string> remaining;
+    error.clear();
+    if (!Kitbase::Cli::TakeTrailing(args, &spec, &trailing, &remaining, &error)) {
+        CheckRefusal(error);
+        return;
+    }
+    // What is left is the words in their order, some taken out.
+    std::size_t at = 0;
+    for (const std::string& word : remaining) {
+        while (at < args.size() && args[at] != word) ++at;
+        if (at == args.size()) abort();
+        ++at;
+    }
+}
+
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
@@ -71,6 +109,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     }
     if (size > 1) args.push_back(current);
 
+    CheckGlobalOptions(spec, args);
     Kitbase::Engine::ParseOutcome outcome = Kitbase::Engine::ParseOptions(spec, args);
     switch (outcome.status) {
         case Kitbase::Engine::ParseOutcome::kOk: {
@@ -89,10 +128,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         case Kitbase::Engine::ParseOutcome::kHelp:
             break;
         case Kitbase::Engine::ParseOutcome::kError:
-            if (outcome.error.empty() || outcome.error.find('\n') != std::string::npos ||
-                outcome.input) {
-                abort();
-            }
+            if (outcome.input) abort();
+            CheckRefusal(outcome.error);
             break;
     }
     return 0;

@@ -1,6 +1,8 @@
 // Plug-in discovery and registration.
 #include "cli/PluginSet.h"
 
+#include "util/Text.h"
+
 #include <norlithctl/RavelException.h>
 
 #include <algorithm>
@@ -9,6 +11,7 @@
 #include <dirent.h>
 #include <dlfcn.h>
 #include <exception>
+#include <unistd.h>
 
 namespace Kitbase {
 namespace Cli {
@@ -34,7 +37,24 @@ bool ListPlugins(const std::string& directory, std::vector<std::string>* names) 
     return true;
 }
 
+// A path in a message: quoted and escaped like any user text, but cut only when absurdly long.
+std::string QuotePath(const std::string& path) { return quarn::util::Quote(path, 1024); }
+
 }  // namespace
+
+bool DefaultPluginDir(const char* exeLink, std::string* dir, std::string* error) {
+    char path[4096];
+    ssize_t size = readlink(exeLink, path, sizeof path);
+    std::string exe = size > 0 ? std::string(path, static_cast<std::size_t>(size)) : std::string();
+    if (size <= 0 || static_cast<std::size_t>(size) >= sizeof path || exe[0] != '/') {
+        std::string why = size < 0 ? std::strerror(errno) : "not an absolute path";
+        *error = std::string("cannot find the plug-in directory: the program's location (") +
+                 exeLink + ") cannot be read: " + why + "; give --plugin-dir DIR";
+        return false;
+    }
+    *dir = exe.substr(0, exe.rfind('/')) + "/../lib/quarncli/plugins";
+    return true;
+}
 
 PluginSet::~PluginSet() {
     for (std::size_t i = handles_.size(); i > 0; --i) dlclose(handles_[i - 1]);
@@ -45,7 +65,8 @@ bool PluginSet::LoadDirectory(const std::string& directory,
                               std::vector<std::string>* problems, std::string* error) {
     std::vector<std::string> names;
     if (!ListPlugins(directory, &names)) {
-        *error = "cannot read the plug-in directory '" + directory + "': " + std::strerror(errno);
+        *error = "cannot read the plug-in directory " + QuotePath(directory) + ": " +
+                 std::strerror(errno);
         return false;
     }
     for (std::size_t i = 0; i < names.size(); ++i) {
@@ -53,14 +74,14 @@ bool PluginSet::LoadDirectory(const std::string& directory,
         void* handle = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
         if (handle == nullptr) {
             const char* why = dlerror();
-            problems->push_back("cannot load plug-in '" + path + "': " +
+            problems->push_back("cannot load plug-in " + QuotePath(path) + ": " +
                                 (why ? why : "unknown dlopen error"));
             continue;
         }
         dlerror();
         void* symbol = dlsym(handle, kEntryPoint);
         if (symbol == nullptr) {
-            problems->push_back("plug-in '" + path + "' has no entry point " + kEntryPoint +
+            problems->push_back("plug-in " + QuotePath(path) + " has no entry point " + kEntryPoint +
                                 "; skipped");
             dlclose(handle);
             continue;
@@ -82,7 +103,7 @@ bool PluginSet::LoadDirectory(const std::string& directory,
             failure = "an exception of unknown type";
         }
         if (failed) {
-            problems->push_back("plug-in '" + path + "' failed while registering its commands: " +
+            problems->push_back("plug-in " + QuotePath(path) + " failed while registering its commands: " +
                                 failure);
         }
     }

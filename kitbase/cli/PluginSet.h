@@ -5,6 +5,10 @@
 // whatever holds objects made by a plug-in (the command tree, results) must be gone by then.
 // A plug-in that cannot be opened, lacks the entry point, or throws from it is reported in one
 // line naming the file, and the others still load.
+//
+// DefaultPluginDir finds the directory next to the running program; when the program's own
+// location cannot be read it fails rather than fall back to a directory relative to the
+// current one, where anybody could plant a plug-in.
 #pragma once
 
 #include <kitbase/AutoCli.h>
@@ -16,6 +20,11 @@
 
 namespace Kitbase {
 namespace Cli {
+
+// <directory of the program>/../lib/quarncli/plugins, the program being what exeLink (normally
+// /proc/self/exe) points to. False with *error set (one line) when the link cannot be read or
+// does not name an absolute path.
+bool DefaultPluginDir(const char* exeLink, std::string* dir, std::string* error);
 
 class PluginSet {
 public:

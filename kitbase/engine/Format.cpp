@@ -3,6 +3,8 @@
 
 #include "engine/Text.h"
 
+#include "util/Text.h"
+
 #include <charconv>
 
 namespace Kitbase {
@@ -227,9 +229,17 @@ void AppendText(std::string& text, const MetaObject* value) {
 void PutText(Writer& out, const MetaObject* value, std::string& scratch) {
     if (value == nullptr || !value->HasValue()) return;
     switch (value->GetType()) {
-        case MetaObj::MetaTypeString:
-            out.Put(static_cast<const MetaString*>(value)->GetValue());
+        case MetaObj::MetaTypeString: {
+            const std::string& text = static_cast<const MetaString*>(value)->GetValue();
+            if (!quarn::util::NeedsEscape(text.data(), text.size())) {
+                out.Put(text);
+                return;
+            }
+            scratch.clear();
+            quarn::util::EscapeTo(scratch, text.data(), text.size());
+            out.Put(scratch);
             return;
+        }
         case MetaObj::MetaTypeInt:
             out.PutInt(static_cast<const MetaInt*>(value)->GetValue());
             return;
@@ -243,7 +253,7 @@ void PutText(Writer& out, const MetaObject* value, std::string& scratch) {
         default:
             scratch.clear();
             AppendText(scratch, value);
-            out.Put(scratch);
+            PutEscaped(out, scratch);
             return;
     }
 }
@@ -251,8 +261,13 @@ void PutText(Writer& out, const MetaObject* value, std::string& scratch) {
 std::size_t TextWidth(const MetaObject* value, std::string& scratch) {
     if (value == nullptr || !value->HasValue()) return 0;
     switch (value->GetType()) {
-        case MetaObj::MetaTypeString:
-            return DisplayWidth(static_cast<const MetaString*>(value)->GetValue());
+        case MetaObj::MetaTypeString: {
+            const std::string& text = static_cast<const MetaString*>(value)->GetValue();
+            if (!quarn::util::NeedsEscape(text.data(), text.size())) return DisplayWidth(text);
+            scratch.clear();
+            quarn::util::EscapeTo(scratch, text.data(), text.size());
+            return DisplayWidth(scratch);
+        }
         case MetaObj::MetaTypeInt: {
             char digits[24];
             std::to_chars_result result = std::to_chars(
@@ -264,20 +279,14 @@ std::size_t TextWidth(const MetaObject* value, std::string& scratch) {
         default:
             scratch.clear();
             AppendText(scratch, value);
-            return DisplayWidth(scratch);
+            return EscapedWidth(scratch.data(), scratch.size());
     }
 }
 
-void PutOneLine(Writer& out, const char* text, std::size_t size) {
-    std::size_t run = 0;
-    for (std::size_t i = 0; i < size; ++i) {
-        unsigned char c = static_cast<unsigned char>(text[i]);
-        if (c >= 0x20 && c != 0x7f) continue;
-        out.Put(text + run, i - run);
-        out.Put(' ');
-        run = i + 1;
-    }
-    out.Put(text + run, size - run);
+void AppendShown(std::string& text, const MetaObject* value, std::string& scratch) {
+    scratch.clear();
+    AppendText(scratch, value);
+    quarn::util::EscapeTo(text, scratch.data(), scratch.size());
 }
 
 }  // namespace Fmt

@@ -10,9 +10,13 @@
 //   show-header:<Struct>     "false": simple omits the "<Struct>:" line, table its heading row
 //   table-columns            table and csv: the columns and their order (wins over fields:)
 //   units:<Struct>.<Field>   simple: " <unit>" after the value; table: heading "Field (unit)"
-//   wrap-last                "true": table wraps its last column to fit the width
+//   wrap-last                "true": a table too wide for the width narrows its last column first
 //
-// Rendering reads the result and never changes it; it throws nothing but std::bad_alloc.
+// simple, table and keyvalue show text in the terminal escape form (engine/Text.h PutEscaped);
+// csv quotes per RFC 4180; json and xml escape by their own rules. The user's settings are
+// checked against the result's shape beforehand (engine/FormatCheck.h); the formatters take
+// whatever they are given. Rendering reads the result and never changes it; it throws nothing
+// but std::bad_alloc.
 #pragma once
 
 #include "engine/Writer.h"
@@ -55,7 +59,7 @@ struct RenderRequest {
     const MetaObj::MetaObject* result = nullptr;          // what to render; not null
     const MetaObj::MetaObject* resultTemplate = nullptr;  // the OutputSpec template, or null
     const FormatParams* params = nullptr;                 // null: no parameters
-    std::size_t width = 80;                               // terminal columns (table wrap-last)
+    std::size_t width = 80;                               // terminal columns (table fitting)
 };
 
 // The kind's name as the schema and messages print it: bool, int, string, struct, list.

@@ -86,15 +86,15 @@ private:
 
 // One-line text of a value, as simple, table and csv show it: a scalar's value (empty when it
 // has none), the elements of a list of scalars joined by ", ", a list of structures as
-// "{Field: value, ...}" items joined by ", ". Null shows as empty text.
+// "{Field: value, ...}" items joined by ", ". Null shows as empty text. Raw: not escaped.
 void AppendText(std::string& text, const MetaObject* value);
-// The same straight into a writer; scalars take no detour through a string.
+// The same as a terminal shows it (escaped, see PutEscaped) straight into a writer; scalars take
+// no detour through a string unless they need escaping. scratch is reused between calls.
 void PutText(Writer& out, const MetaObject* value, std::string& scratch);
-// Display width of that text.
+// Display width of the shown (escaped) text.
 std::size_t TextWidth(const MetaObject* value, std::string& scratch);
-
-// Text for a table or csv cell kept on one line: control characters become blanks.
-void PutOneLine(Writer& out, const char* text, std::size_t size);
+// Appends the shown (escaped) text of value to text.
+void AppendShown(std::string& text, const MetaObject* value, std::string& scratch);
 
 }  // namespace Fmt
 }  // namespace Engine

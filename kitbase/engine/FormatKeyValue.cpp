@@ -3,10 +3,13 @@
 // Keys: a structure's fields are Struct.Field; the rows of a list of structures are
 // Struct[i].Field; elements of a list field are Struct.Field[j], and structures inside a list
 // field continue the key: Struct.Field[j].Inner. A scalar result is Value=..., a list of scalars
-// Value[i]=... Fields come in template order, then the rest. Values are written as they are,
-// except that backslash, newline and carriage return are escaped as \\, \n and \r so that every
-// entry stays on one line; a value-less scalar gives an empty value, an empty list no line.
+// Value[i]=... Fields come in template order, then the rest. Values are written in the terminal
+// escape form with backslashes escaped too (\\, \n, \r, \t, \xNN), so every entry stays on one
+// line and decodes back to the value; a value-less scalar gives an empty value, an empty list
+// no line. Keys are escaped the same way.
 #include "engine/FormatCommon.h"
+
+#include "engine/Text.h"
 
 
 namespace Kitbase {
@@ -80,25 +83,17 @@ private:
             }
             return;
         }
-        out_.Put(key);
+        PutEscaped(out_, key, true, escaped_);
         out_.Put('=');
         scratch_.clear();
         AppendText(scratch_, value);
-        std::size_t run = 0;
-        for (std::size_t i = 0; i < scratch_.size(); ++i) {
-            char c = scratch_[i];
-            if (c != '\\' && c != '\n' && c != '\r') continue;
-            out_.Put(scratch_.data() + run, i - run);
-            out_.Put('\\');
-            out_.Put(c == '\n' ? 'n' : (c == '\r' ? 'r' : '\\'));
-            run = i + 1;
-        }
-        out_.Put(scratch_.data() + run, scratch_.size() - run);
+        PutEscaped(out_, scratch_, true, escaped_);
         out_.Put('\n');
     }
 
     Writer& out_;
     std::string scratch_;
+    std::string escaped_;
 };
 
 }  // namespace

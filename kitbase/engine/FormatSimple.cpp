@@ -5,8 +5,12 @@
 //      Nested:              a list of structures: its elements one level deeper still
 //
 // A list of structures prints its elements as blocks separated by blank lines, a list of scalars
-// one element per line, a scalar alone on its line.
+// one element per line, a scalar alone on its line. Names, values and units are shown in the
+// terminal escape form (PutEscaped), so host data never forges a line or reaches the terminal
+// as a control sequence.
 #include "engine/FormatCommon.h"
+
+#include "engine/Text.h"
 
 #include <map>
 
@@ -64,7 +68,7 @@ private:
         const std::string& name = row.GetName();
         if (params_.ShowHeader(name)) {
             out_.PutRepeat(' ', indent);
-            out_.Put(name);
+            PutEscaped(out_, name);
             out_.Put(":\n", 2);
         }
         bool selected = !params_.Fields(name).empty();
@@ -88,7 +92,7 @@ private:
     void Field(const std::string& structName, const std::string& fieldName,
                const MetaObject* value, const MetaObject* fieldTemplate, std::size_t indent) {
         out_.PutRepeat(' ', indent);
-        out_.Put(fieldName);
+        PutEscaped(out_, fieldName);
         out_.Put(':');
         if (value != nullptr && IsStructList(*value)) {
             out_.Put('\n');
@@ -105,11 +109,11 @@ private:
         AppendText(scratch_, value);
         if (!scratch_.empty()) {
             out_.Put(' ');
-            out_.Put(scratch_);
+            PutEscaped(out_, scratch_, false, escaped_);
             const std::string* unit = params_.Unit(structName, fieldName);
             if (unit != nullptr && value->GetType() != MetaObj::MetaTypeList) {
                 out_.Put(' ');
-                out_.Put(*unit);
+                PutEscaped(out_, *unit);
             }
         }
         out_.Put('\n');
@@ -120,6 +124,7 @@ private:
     std::map<std::string, Columns> columns_;
     std::map<std::string, const MetaStruct*> templates_;
     std::string scratch_;
+    std::string escaped_;
 };
 
 }  // namespace

@@ -2,12 +2,21 @@
 //
 // Columns: table-columns when set, else fields:<Struct>, else the template's fields followed by
 // the fields the rows add (in order of first appearance). A table is aligned by display width
-// (code points) in two passes over the rows, writing cells straight from the meta objects; only
-// list cells and the wrapped last column go through a reused scratch string. A scalar result, or
-// a list of scalars, prints as "simple" does (csv: one value per line).
+// (code points of the shown text: cells are in the terminal escape form) in two passes over the
+// rows, writing cells straight from the meta objects. A table wider than the terminal is fitted:
+// columns are narrowed (each keeps at least its longest word while the words fit) and their
+// cells wrap at blanks, a word being split only when it alone is wider than its column. With
+// wrap-last the last column gives way first: the others keep their width while the last has 10
+// columns or more. A scalar result, or a list of scalars, prints as "simple" does (csv: one
+// value per line, quoted per RFC 4180).
 #include "engine/FormatCommon.h"
 
 #include "engine/Text.h"
+
+#include "util/Text.h"
+
+#include <algorithm>
+#include <numeric>
 
 namespace Kitbase {
 namespace Engine {
@@ -15,8 +24,8 @@ namespace {
 
 using namespace Fmt;
 
-const std::size_t kGap = 2;          // blanks between table columns
-const std::size_t kMinWrapWidth = 10;  // the wrapped last column is never narrower
+const std::size_t kGap = 2;            // blanks between table columns
+const std::size_t kMinWrapWidth = 10;  // wrap-last leaves the last column at least this wide
 
 // The rows of a structure or list-of-structures result, and the columns they are shown in.
 struct Grid {
@@ -103,6 +112,49 @@ private:
     bool done_;
 };
 
+// Display width of the widest blank-separated word of text.
+std::size_t LongestWord(const std::string& text) {
+    std::size_t longest = 0, start = 0;
+    while (start <= text.size()) {
+        std::size_t blank = text.find(' ', start);
+        if (blank == std::string::npos) blank = text.size();
+        longest = std::max(longest, DisplayWidth(text.data() + start, blank - start));
+        start = blank + 1;
+    }
+    return longest;
+}
+
+// Shares room among columns, none getting more than its cap: the narrow ones get their cap, the
+// others an equal share of what is left (the remainder going to the leftmost). Each column gets
+// at least one column of room when caps allow.
+std::vector<std::size_t> Share(const std::vector<std::size_t>& caps, std::size_t room) {
+    std::vector<std::size_t> order(caps.size());
+    std::iota(order.begin(), order.end(), 0);
+    std::stable_sort(order.begin(), order.end(),
+                     [&caps](std::size_t a, std::size_t b) { return caps[a] < caps[b]; });
+    std::vector<std::size_t> given(caps.size(), 0);
+    std::size_t left = caps.size();
+    for (std::size_t k = 0; k < order.size(); ++k, --left) {
+        std::size_t share = room / left;
+        if (caps[order[k]] <= share) {
+            given[order[k]] = caps[order[k]];
+            room -= caps[order[k]];
+            continue;
+        }
+        // Every remaining column is wider than the fair share: split what is left evenly.
+        std::vector<std::size_t> rest(order.begin() + static_cast<std::ptrdiff_t>(k), order.end());
+        std::sort(rest.begin(), rest.end());
+        for (std::size_t r = 0; r < rest.size(); ++r) {
+            given[rest[r]] = share + (r < room % left ? 1 : 0);
+        }
+        break;
+    }
+    for (std::size_t c = 0; c < given.size(); ++c) {
+        if (given[c] == 0 && caps[c] > 0) given[c] = 1;
+    }
+    return given;
+}
+
 class TableFormatter {
 public:
     TableFormatter(const FormatParams& params, std::size_t width, Writer& out)
@@ -124,32 +176,24 @@ public:
         if (count == 0) return;
         widths_.resize(count, 0);
         headings_.resize(count);
-        bool header = params_.ShowHeader(grid.structName);
+        header_ = params_.ShowHeader(grid.structName);
         for (std::size_t c = 0; c < count; ++c) {
-            headings_[c] = columns.Name(c);
-            const std::string* unit = params_.Unit(grid.structName, columns.Name(c));
-            if (unit != nullptr) headings_[c] += " (" + *unit + ")";
-            if (header) {
-                std::size_t w = DisplayWidth(headings_[c]);
-                if (w > widths_[c]) widths_[c] = w;
-            }
+            headings_[c].clear();
+            SetHeading(c, columns.Name(c), params_.Unit(grid.structName, columns.Name(c)));
+            if (header_) widths_[c] = std::max(widths_[c], DisplayWidth(headings_[c]));
         }
-        // The wrapped last column takes what the others leave of the terminal.
-        wrap_ = false;
-        if (params_.WrapLast()) {
-            std::size_t used = 0;
-            for (std::size_t c = 0; c + 1 < count; ++c) used += widths_[c] + kGap;
-            std::size_t room = terminalWidth_ > used ? terminalWidth_ - used : 0;
-            if (room < kMinWrapWidth) room = kMinWrapWidth;
-            if (widths_[count - 1] > room) {
-                widths_[count - 1] = room;
-                wrap_ = true;
-            }
-        }
+        std::vector<std::size_t> natural = widths_;
+        Fit(grid);
+        wrap_ = widths_ != natural;
         // Pass 2: heading, dashes, rows.
-        if (header) {
-            for (std::size_t c = 0; c + 1 < count; ++c) Cell(c, headings_[c]);
-            LastCell(headings_[count - 1], count);
+        if (header_) {
+            for (std::size_t c = 0; c < count; ++c) lines_[c] = headings_[c];
+            if (wrap_) {
+                WrappedRow(count);
+            } else {
+                for (std::size_t c = 0; c < count; ++c) Cell(c, headings_[c]);
+                EndLine();
+            }
             for (std::size_t c = 0; c < count; ++c) {
                 Gap();
                 out_.PutRepeat('-', widths_[c]);
@@ -160,19 +204,120 @@ public:
         for (std::size_t r = 0; r < grid.rows.size(); ++r) {
             columns.Map(*grid.rows[r]);
             const std::vector<const MetaObject*>& cells = columns.Cells();
-            for (std::size_t c = 0; c + 1 < count; ++c) Cell(c, cells[c]);
             if (wrap_) {
-                scratch_.clear();
-                AppendText(scratch_, cells[count - 1]);
-                LastCell(scratch_, count);
+                for (std::size_t c = 0; c < count; ++c) {
+                    lines_[c].clear();
+                    AppendShown(lines_[c], cells[c], scratch_);
+                }
+                WrappedRow(count);
             } else {
-                Cell(count - 1, cells[count - 1]);
+                for (std::size_t c = 0; c < count; ++c) Cell(c, cells[c]);
                 EndLine();
             }
         }
     }
 
 private:
+    void SetHeading(std::size_t c, const std::string& name, const std::string* unit) {
+        std::string heading = name;
+        if (unit != nullptr) heading += " (" + *unit + ")";
+        headings_[c] = Escaped(heading);
+    }
+
+    // Narrows the columns to the terminal width when the table is wider (widths_ holds the
+    // natural widths on entry). Each column keeps its longest word while those fit together.
+    void Fit(Grid& grid) {
+        const std::size_t count = widths_.size();
+        lines_.assign(count, std::string());
+        std::size_t gaps = kGap * (count - 1);
+        std::size_t total = std::accumulate(widths_.begin(), widths_.end(), gaps);
+        if (total <= terminalWidth_) return;
+        std::size_t room = terminalWidth_ > gaps ? terminalWidth_ - gaps : 0;
+        if (params_.WrapLast()) {
+            // The last column gives way first, down to kMinWrapWidth.
+            std::size_t others = total - widths_[count - 1];
+            std::size_t last = terminalWidth_ > others ? terminalWidth_ - others : 0;
+            last = std::max(last, std::min(widths_[count - 1], kMinWrapWidth));
+            if (others + last <= terminalWidth_ || count == 1) {
+                widths_[count - 1] = std::min(widths_[count - 1], std::max<std::size_t>(last, 1));
+                return;
+            }
+        }
+        std::vector<std::size_t> words = LongestWords(grid);
+        std::size_t needed = std::accumulate(words.begin(), words.end(), std::size_t(0));
+        if (needed > room) {
+            widths_ = Share(words, room);
+            return;
+        }
+        std::vector<std::size_t> natural = widths_;
+        std::vector<std::size_t> more(count);
+        for (std::size_t c = 0; c < count; ++c) more[c] = widths_[c] - words[c];
+        std::vector<std::size_t> extra = Share(more, room - needed);
+        for (std::size_t c = 0; c < count; ++c) widths_[c] = words[c] + extra[c];
+        Tighten(grid, natural);
+    }
+
+    // A narrowed column whose wrapped cells leave part of it blank on every line gives that
+    // part to the narrowed columns that can still use it.
+    void Tighten(Grid& grid, const std::vector<std::size_t>& natural) {
+        const std::size_t count = widths_.size();
+        std::vector<std::size_t> used(count, 0);
+        auto measure = [&](std::size_t c, const std::string& text) {
+            Segments segments(text, widths_[c]);
+            const char* data;
+            std::size_t size;
+            while (segments.Next(&data, &size)) used[c] = std::max(used[c], DisplayWidth(data, size));
+        };
+        if (header_) {
+            for (std::size_t c = 0; c < count; ++c) {
+                if (widths_[c] < natural[c]) measure(c, headings_[c]);
+            }
+        }
+        for (std::size_t r = 0; r < grid.rows.size(); ++r) {
+            grid.columns.Map(*grid.rows[r]);
+            const std::vector<const MetaObject*>& cells = grid.columns.Cells();
+            for (std::size_t c = 0; c < count; ++c) {
+                if (widths_[c] >= natural[c]) continue;
+                line_.clear();
+                AppendShown(line_, cells[c], scratch_);
+                measure(c, line_);
+            }
+        }
+        std::size_t slack = 0;
+        std::vector<std::size_t> caps(count, 0);
+        for (std::size_t c = 0; c < count; ++c) {
+            if (widths_[c] >= natural[c]) continue;
+            if (used[c] < widths_[c]) {
+                slack += widths_[c] - std::max<std::size_t>(used[c], 1);
+                widths_[c] = std::max<std::size_t>(used[c], 1);
+            } else {
+                caps[c] = natural[c] - widths_[c];
+            }
+        }
+        std::vector<std::size_t> extra = Share(caps, slack);
+        for (std::size_t c = 0; c < count; ++c) widths_[c] += extra[c];
+    }
+
+    // Per column: the widest word of its cells and heading (never more than the column).
+    std::vector<std::size_t> LongestWords(Grid& grid) {
+        const std::size_t count = widths_.size();
+        std::vector<std::size_t> words(count, 0);
+        if (header_) {
+            for (std::size_t c = 0; c < count; ++c) words[c] = LongestWord(headings_[c]);
+        }
+        for (std::size_t r = 0; r < grid.rows.size(); ++r) {
+            grid.columns.Map(*grid.rows[r]);
+            const std::vector<const MetaObject*>& cells = grid.columns.Cells();
+            for (std::size_t c = 0; c < count; ++c) {
+                line_.clear();
+                AppendShown(line_, cells[c], scratch_);
+                words[c] = std::max(words[c], LongestWord(line_));
+            }
+        }
+        for (std::size_t c = 0; c < count; ++c) words[c] = std::min(words[c], widths_[c]);
+        return words;
+    }
+
     // Blanks owed before the next cell; dropped at the end of a line, so no line ends in blanks.
     void Gap() {
         if (pending_ > 0) out_.PutRepeat(' ', pending_);
@@ -183,11 +328,12 @@ private:
         pending_ = 0;
     }
 
+    // A cell already in shown form.
     void Cell(std::size_t column, const std::string& text) {
         std::size_t w = DisplayWidth(text);
         if (w > 0) {
             Gap();
-            PutOneLine(out_, text.data(), text.size());
+            out_.Put(text);
         }
         pending_ += widths_[column] - w + kGap;
     }
@@ -195,70 +341,74 @@ private:
     void Cell(std::size_t column, const MetaObject* value) {
         std::size_t w;
         if (value != nullptr && value->GetType() == MetaObj::MetaTypeString) {
+            // Escaped once, measured and written from the same text.
             const std::string& text = static_cast<const MetaString*>(value)->GetValue();
-            w = value->HasValue() ? DisplayWidth(text) : 0;
+            const std::string* shown = &text;
+            if (quarn::util::NeedsEscape(text.data(), text.size())) {
+                scratch_.clear();
+                quarn::util::EscapeTo(scratch_, text.data(), text.size());
+                shown = &scratch_;
+            }
+            w = value->HasValue() ? DisplayWidth(*shown) : 0;
             if (w > 0) {
                 Gap();
-                PutOneLine(out_, text.data(), text.size());
+                out_.Put(*shown);
             }
-        } else if (value != nullptr && IsScalar(*value)) {
+        } else {
             w = TextWidth(value, scratch_);
             if (w > 0) {
                 Gap();
                 PutText(out_, value, scratch_);
             }
-        } else {
-            scratch_.clear();
-            AppendText(scratch_, value);
-            w = DisplayWidth(scratch_);
-            if (w > 0) {
-                Gap();
-                PutOneLine(out_, scratch_.data(), scratch_.size());
-            }
         }
         pending_ += widths_[column] - w + kGap;
     }
 
-    // The last column, wrapped when wrap-last applies; ends the line(s).
-    void LastCell(const std::string& text, std::size_t count) {
-        if (!wrap_) {
-            if (!text.empty()) {
-                Gap();
-                PutOneLine(out_, text.data(), text.size());
+    // One row whose cells (lines_, in shown form) wrap inside their columns: as many lines as
+    // its tallest cell needs.
+    void WrappedRow(std::size_t count) {
+        segments_.clear();
+        for (std::size_t c = 0; c < count; ++c) segments_.emplace_back(lines_[c], widths_[c]);
+        pieces_.assign(count, Piece());
+        while (true) {
+            bool any = false;
+            for (std::size_t c = 0; c < count; ++c) {
+                Piece& piece = pieces_[c];
+                piece.size = 0;
+                if (!piece.done && !segments_[c].Next(&piece.data, &piece.size)) piece.done = true;
+                any = any || !piece.done;
+            }
+            if (!any) break;
+            for (std::size_t c = 0; c < count; ++c) {
+                const Piece& piece = pieces_[c];
+                std::size_t w = piece.done ? 0 : DisplayWidth(piece.data, piece.size);
+                if (w > 0) {
+                    Gap();
+                    out_.Put(piece.data, piece.size);
+                }
+                pending_ += widths_[c] - std::min(w, widths_[c]) + kGap;
             }
             EndLine();
-            return;
         }
-        line_ = text;
-        for (std::size_t i = 0; i < line_.size(); ++i) {
-            unsigned char c = static_cast<unsigned char>(line_[i]);
-            if (c < 0x20 || c == 0x7f) line_[i] = ' ';
-        }
-        std::size_t offset = 0;
-        for (std::size_t c = 0; c + 1 < count; ++c) offset += widths_[c] + kGap;
-        Segments segments(line_, widths_[count - 1]);
-        const char* data;
-        std::size_t size;
-        bool first = true;
-        while (segments.Next(&data, &size)) {
-            if (!first) pending_ = offset;
-            if (size > 0) {
-                Gap();
-                out_.Put(data, size);
-            }
-            EndLine();
-            first = false;
-        }
-        if (first) EndLine();
     }
+
+    struct Piece {
+        const char* data = nullptr;
+        std::size_t size = 0;
+        bool done = false;
+    };
 
     const FormatParams& params_;
     std::size_t terminalWidth_;
     Writer& out_;
     std::size_t pending_;
+    bool header_ = true;
     bool wrap_ = false;
     std::vector<std::size_t> widths_;
     std::vector<std::string> headings_;
+    std::vector<std::string> lines_;  // a wrapped row's cells
+    std::vector<Segments> segments_;
+    std::vector<Piece> pieces_;
     std::string scratch_;
     std::string line_;
 };

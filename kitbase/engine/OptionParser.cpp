@@ -68,8 +68,10 @@ std::string IntAccepts(const ParameterSpec& parameter) {
 
 class Parser {
 public:
-    Parser(const InputSpec& spec, const std::vector<std::string>& args)
-        : spec_(spec), args_(args), given_(spec.GetParameters().size(), false) {
+    Parser(const InputSpec& spec, const std::vector<std::string>& args,
+           const std::vector<std::string>& moreNames)
+        : spec_(spec), args_(args), moreNames_(moreNames),
+          given_(spec.GetParameters().size(), false) {
         outcome_.status = ParseOutcome::kOk;
         outcome_.input = CallSpec::Input::New();
     }
@@ -109,9 +111,10 @@ private:
         return 0;
     }
 
-    // Whether a word would be read as an option rather than as a value.
+    // Whether a word would be read as an option rather than as a value. The bare "--" is one
+    // too: taken as a value it would hide a forgotten value behind what reads as a separator.
     bool LooksLikeOption(const std::string& word) const {
-        if (word.size() > 2 && word[0] == '-' && word[1] == '-') return true;
+        if (word.size() >= 2 && word[0] == '-' && word[1] == '-') return true;
         return word.size() >= 2 && word[0] == '-' &&
                static_cast<bool>(spec_.FindShort(word.substr(1, 1)));
     }
@@ -119,15 +122,18 @@ private:
     std::string UnknownOption(const std::string& word) const {
         std::string message = "unknown option " + Quote(word);
         const std::vector<ParameterPtr>& all = spec_.GetParameters();
-        if (all.empty()) return message + "; this command takes no options";
         std::vector<std::string> names;
         for (std::size_t i = 0; i < all.size(); ++i) names.push_back("--" + all[i]->GetName());
+        // Suggestions also come from the other names valid here (the global options).
+        std::vector<std::string> candidates = names;
+        candidates.insert(candidates.end(), moreNames_.begin(), moreNames_.end());
         std::string typed = word;
         std::string::size_type eq = typed.find('=');
         if (eq != std::string::npos) typed.erase(eq);
-        std::vector<std::string> near = NearestNames(typed, names);
+        std::vector<std::string> near = NearestNames(typed, candidates);
         if (!near.empty())
             return message + "; did you mean " + JoinNames(QuoteEach(near), " or ") + "?";
+        if (all.empty()) return message + "; this command takes no options";
         return message + "; valid options: " + JoinNames(names, " and ");
     }
 
@@ -295,6 +301,7 @@ private:
 
     const InputSpec& spec_;
     const std::vector<std::string>& args_;
+    const std::vector<std::string>& moreNames_;
     std::vector<bool> given_;
     ParseOutcome outcome_;
 };
@@ -302,7 +309,13 @@ private:
 }  // namespace
 
 ParseOutcome ParseOptions(const InputSpec& spec, const std::vector<std::string>& args) {
-    return Parser(spec, args).Run();
+    static const std::vector<std::string> kNone;
+    return Parser(spec, args, kNone).Run();
+}
+
+ParseOutcome ParseOptions(const InputSpec& spec, const std::vector<std::string>& args,
+                          const std::vector<std::string>& moreNames) {
+    return Parser(spec, args, moreNames).Run();
 }
 
 }  // namespace Engine

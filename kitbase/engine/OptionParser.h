@@ -3,8 +3,9 @@
 //
 // Accepted forms: --long VALUE, --long=VALUE, -s VALUE, -sVALUE; a flag takes no value; a boolean
 // takes true/false/yes/no/1/0 in any case; an integer is decimal 64-bit signed. A separate VALUE
-// is the next word unless that word looks like an option (starts with "--", or is '-' and a
-// declared short name); such a value needs the '=' form. --help or -h anywhere (when the command
+// is the next word unless that word looks like an option (starts with "--", the bare "--"
+// included, or is '-' and a declared short name); such a value needs the '=' form. Commands take
+// no positional words, so "--" ends nothing: it is refused like any stray word. --help or -h anywhere (when the command
 // does not declare them itself) asks for the command's help instead.
 //
 // After parsing, required parameters, integer ranges and whole-value regular expressions are
@@ -37,6 +38,11 @@ const std::size_t kMaxRegexValueLength = 1024;
 
 KITBASE_API ParseOutcome ParseOptions(const CallSpec::InputSpec& spec,
                                       const std::vector<std::string>& args);
+// The same; an unknown option's "did you mean" also considers moreNames (e.g. "--formatter"),
+// which are otherwise not accepted here.
+KITBASE_API ParseOutcome ParseOptions(const CallSpec::InputSpec& spec,
+                                      const std::vector<std::string>& args,
+                                      const std::vector<std::string>& moreNames);
 
 // How a parameter is written on the command line: "--name" or "--name (-n)".
 KITBASE_API std::string OptionLabel(const CallSpec::ParameterSpec& parameter);

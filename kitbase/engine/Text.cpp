@@ -1,11 +1,15 @@
 // Text helpers: parsing, UTF-8, escaping, wrapping and suggestions.
 #include "engine/Text.h"
 
+#include "util/Text.h"
+
 #include <algorithm>
 #include <charconv>
 
 namespace Kitbase {
 namespace Engine {
+
+using quarn::util::Utf8SequenceLength;
 
 bool ParseInt64(const std::string& text, long long* value) {
     const char* begin = text.data();
@@ -34,7 +38,6 @@ bool EqualsNoCase(const std::string& text, const char* word) {
     return i == text.size();
 }
 
-char Lower(char c) { return (c >= 'A' && c <= 'Z') ? static_cast<char>(c - 'A' + 'a') : c; }
 }  // namespace
 
 bool ParseBool(const std::string& text, bool* value) {
@@ -47,33 +50,6 @@ bool ParseBool(const std::string& text, bool* value) {
         return true;
     }
     return false;
-}
-
-std::size_t Utf8SequenceLength(const unsigned char* p, std::size_t left) {
-    if (left == 0) return 0;
-    unsigned char c = p[0];
-    if (c < 0x80) return 1;
-    std::size_t length;
-    unsigned char low = 0x80, high = 0xBF;  // bounds of the second byte
-    if (c >= 0xC2 && c <= 0xDF) {
-        length = 2;
-    } else if (c >= 0xE0 && c <= 0xEF) {
-        length = 3;
-        if (c == 0xE0) low = 0xA0;        // no overlong forms
-        if (c == 0xED) high = 0x9F;       // no surrogates
-    } else if (c >= 0xF0 && c <= 0xF4) {
-        length = 4;
-        if (c == 0xF0) low = 0x90;        // no overlong forms
-        if (c == 0xF4) high = 0x8F;       // nothing beyond U+10FFFF
-    } else {
-        return 0;
-    }
-    if (left < length) return 0;
-    if (p[1] < low || p[1] > high) return 0;
-    for (std::size_t i = 2; i < length; ++i) {
-        if ((p[i] & 0xC0) != 0x80) return 0;
-    }
-    return length;
 }
 
 std::size_t DisplayWidth(const char* text, std::size_t size) {
@@ -110,6 +86,20 @@ struct JsonClasses {
 };
 const JsonClasses kJson;
 
+// The two-character escapes JSON has (after the backslash), or 0 for the \u00XX form.
+char ShortJsonEscape(unsigned char c) {
+    switch (c) {
+        case '"': return '"';
+        case '\\': return '\\';
+        case '\n': return 'n';
+        case '\r': return 'r';
+        case '\t': return 't';
+        case '\b': return 'b';
+        case '\f': return 'f';
+        default: return 0;
+    }
+}
+
 }  // namespace
 
 void PutJsonString(Writer& out, const char* text, std::size_t size) {
@@ -137,8 +127,9 @@ void PutJsonString(Writer& out, const char* text, std::size_t size) {
             out.Put(kReplacement, 3);
         } else {
             out.Put('\\');
-            if (c == '"' || c == '\\') {
-                out.Put(static_cast<char>(c));
+            char shortForm = ShortJsonEscape(c);
+            if (shortForm != 0) {
+                out.Put(shortForm);
             } else {
                 char escape[5] = {'u', '0', '0', kHex[c >> 4], kHex[c & 15]};
                 out.Put(escape, 5);
@@ -261,78 +252,46 @@ std::vector<std::string> SplitCommaList(const std::string& text) {
     return items;
 }
 
-std::size_t EditDistance(const std::string& a, const std::string& b) {
-    const std::size_t n = a.size(), m = b.size();
-    // Three rows suffice for the transposition rule.
-    std::vector<std::size_t> before(m + 1), previous(m + 1), current(m + 1);
-    for (std::size_t j = 0; j <= m; ++j) previous[j] = j;
-    for (std::size_t i = 1; i <= n; ++i) {
-        current[0] = i;
-        for (std::size_t j = 1; j <= m; ++j) {
-            std::size_t cost = Lower(a[i - 1]) == Lower(b[j - 1]) ? 0 : 1;
-            std::size_t best = std::min(previous[j] + 1, current[j - 1] + 1);
-            best = std::min(best, previous[j - 1] + cost);
-            if (i > 1 && j > 1 && Lower(a[i - 1]) == Lower(b[j - 2]) &&
-                Lower(a[i - 2]) == Lower(b[j - 1])) {
-                best = std::min(best, before[j - 2] + 1);
-            }
-            current[j] = best;
-        }
-        before.swap(previous);
-        previous.swap(current);
-    }
-    return previous[m];
-}
-
 std::vector<std::string> NearestNames(const std::string& word,
                                       const std::vector<std::string>& candidates) {
-    const std::size_t limit = word.size() <= 3 ? 1 : (word.size() <= 6 ? 2 : 3);
-    std::vector<std::pair<std::size_t, std::size_t> > ranked;  // (distance, candidate index)
-    for (std::size_t i = 0; i < candidates.size(); ++i) {
-        const std::string& candidate = candidates[i];
-        std::size_t distance = EditDistance(word, candidate);
-        bool prefix = word.size() >= 2 && candidate.size() > word.size() &&
-                      EditDistance(word, candidate.substr(0, word.size())) == 0;
-        if (distance <= limit || prefix) {
-            ranked.push_back(std::make_pair(prefix ? std::min<std::size_t>(distance, 1) : distance,
-                                            i));
-        }
-    }
-    std::stable_sort(ranked.begin(), ranked.end());
-    std::vector<std::string> names;
-    for (std::size_t i = 0; i < ranked.size() && names.size() < 5; ++i) {
-        if (ranked[i].first != ranked[0].first) break;
-        names.push_back(candidates[ranked[i].second]);
-    }
-    return names;
+    return quarn::util::NearestNames(word, candidates);
 }
 
-std::string Quote(const std::string& text) {
-    static const char kHex[] = "0123456789abcdef";
-    const std::size_t kMaxColumns = 80;
-    std::string quoted = "'";
-    std::size_t columns = 0;
-    for (std::size_t i = 0; i < text.size(); ++i) {
-        unsigned char c = static_cast<unsigned char>(text[i]);
-        if ((c & 0xC0) != 0x80 && ++columns > kMaxColumns) {
-            quoted += "...";
-            break;
-        }
-        if (c == '\n') {
-            quoted += "\\n";
-        } else if (c == '\t') {
-            quoted += "\\t";
-        } else if (c < 0x20 || c == 0x7f) {
-            quoted += "\\x";
-            quoted += kHex[c >> 4];
-            quoted += kHex[c & 15];
-        } else {
-            quoted += static_cast<char>(c);
-        }
+std::string Quote(const std::string& text) { return quarn::util::Quote(text); }
+
+void PutEscaped(Writer& out, const char* text, std::size_t size, bool escapeBackslash) {
+    quarn::util::Backslash backslash =
+        escapeBackslash ? quarn::util::Backslash::kEscape : quarn::util::Backslash::kKeep;
+    if (!quarn::util::NeedsEscape(text, size, backslash)) {
+        out.Put(text, size);
+        return;
     }
-    quoted += "'";
-    return quoted;
+    std::string escaped;
+    quarn::util::EscapeTo(escaped, text, size, backslash);
+    out.Put(escaped);
 }
+
+void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash,
+                std::string& scratch) {
+    quarn::util::Backslash backslash =
+        escapeBackslash ? quarn::util::Backslash::kEscape : quarn::util::Backslash::kKeep;
+    if (!quarn::util::NeedsEscape(text.data(), text.size(), backslash)) {
+        out.Put(text);
+        return;
+    }
+    scratch.clear();
+    quarn::util::EscapeTo(scratch, text.data(), text.size(), backslash);
+    out.Put(scratch);
+}
+
+std::size_t EscapedWidth(const char* text, std::size_t size) {
+    if (!quarn::util::NeedsEscape(text, size)) return DisplayWidth(text, size);
+    std::string escaped;
+    quarn::util::EscapeTo(escaped, text, size);
+    return DisplayWidth(escaped);
+}
+
+std::string Escaped(const std::string& text) { return quarn::util::Escape(text); }
 
 std::vector<std::string> QuoteEach(const std::vector<std::string>& names) {
     std::vector<std::string> quoted;

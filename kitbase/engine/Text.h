@@ -1,6 +1,7 @@
 // Text helpers shared by the parser, the formatters, help and the schema writer: strict number
-// and boolean parsing, UTF-8 measuring and repair, JSON and XML escaping into a Writer, word
-// wrapping, comma lists and the edit distance behind "did you mean" suggestions.
+// and boolean parsing, UTF-8 measuring and repair, JSON and XML escaping into a Writer, the
+// terminal escape form into a Writer, word wrapping and comma lists. UTF-8 checks, suggestions
+// and quoting of user text live in quarnutil (util/Text.h), which libkitbase links privately.
 //
 // Everything here is a pure function of its arguments; nothing throws except std::bad_alloc.
 #pragma once
@@ -23,9 +24,6 @@ KITBASE_API bool ParseInt64(const std::string& text, long long* value);
 // true/false/yes/no/1/0 in any case. False for any other text.
 KITBASE_API bool ParseBool(const std::string& text, bool* value);
 
-// Length of the well-formed UTF-8 sequence starting at text (1 to 4), or 0 when the bytes there
-// are not one (stray continuation byte, overlong form, surrogate, beyond U+10FFFF, cut short).
-KITBASE_API std::size_t Utf8SequenceLength(const unsigned char* text, std::size_t left);
 // Columns the text takes on a terminal, counted as one per code point (bytes that are not UTF-8
 // continuation bytes).
 KITBASE_API std::size_t DisplayWidth(const char* text, std::size_t size);
@@ -35,9 +33,10 @@ inline std::size_t DisplayWidth(const std::string& text) {
 // The byte offset just past the first `columns` code points of text (or size when shorter).
 KITBASE_API std::size_t OffsetOfColumn(const char* text, std::size_t size, std::size_t columns);
 
-// A JSON string literal (quotes included), escaped per RFC 8259: '"' and '\\' as \" and \\, every
-// control character (newline and tab included) as \u00XX, and every byte that is not part of
-// well-formed UTF-8 replaced by U+FFFD, so the output is always valid JSON.
+// A JSON string literal (quotes included), escaped per RFC 8259: '"' and '\\' as \" and \\,
+// newline, carriage return, tab, backspace and form feed as \n, \r, \t, \b and \f, every other
+// control character as \u00XX, and every byte that is not part of well-formed UTF-8 replaced by
+// U+FFFD, so the output is always valid JSON.
 KITBASE_API void PutJsonString(Writer& out, const char* text, std::size_t size);
 inline void PutJsonString(Writer& out, const std::string& text) {
     PutJsonString(out, text.data(), text.size());
@@ -51,6 +50,23 @@ inline void PutXmlText(Writer& out, const std::string& text, bool attribute) {
     PutXmlText(out, text.data(), text.size(), attribute);
 }
 
+// Text for a terminal in the one visible escape form (util/Text.h: \n, \r, \t, \xNN; with
+// Backslash::kEscape also \\): control characters, C1 characters and malformed UTF-8 never reach
+// the terminal raw. Text that needs no escape is written straight through.
+KITBASE_API void PutEscaped(Writer& out, const char* text, std::size_t size,
+                            bool escapeBackslash = false);
+inline void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash = false) {
+    PutEscaped(out, text.data(), text.size(), escapeBackslash);
+}
+// The same, escaping through scratch (reused between calls, so a long run of cells that need
+// escaping costs no allocation each).
+KITBASE_API void PutEscaped(Writer& out, const std::string& text, bool escapeBackslash,
+                            std::string& scratch);
+// Columns that text takes once escaped.
+KITBASE_API std::size_t EscapedWidth(const char* text, std::size_t size);
+// The text escaped, as a string (for messages).
+KITBASE_API std::string Escaped(const std::string& text);
+
 // Splits text into lines of at most width columns, breaking at blanks where possible and inside a
 // word only when the word alone is wider than the line. Existing newlines are kept as breaks.
 KITBASE_API std::vector<std::string> WrapWords(const std::string& text, std::size_t width);
@@ -58,17 +74,11 @@ KITBASE_API std::vector<std::string> WrapWords(const std::string& text, std::siz
 // The comma-separated items of text, each trimmed of blanks; empty items are dropped.
 KITBASE_API std::vector<std::string> SplitCommaList(const std::string& text);
 
-// Optimal string alignment distance (insertions, deletions, substitutions and transpositions of
-// neighbours), comparing ASCII letters without regard to case.
-KITBASE_API std::size_t EditDistance(const std::string& a, const std::string& b);
-// The candidates nearest to word: among those within a small distance that grows with the word's
-// length (a candidate the word begins counts as distance 1), the ones at the smallest distance,
-// at most five, in the candidates' order. Empty when none is near.
+// User text for a one-line message: in single quotes, escaped, and cut to 80 columns with "...".
+KITBASE_API std::string Quote(const std::string& text);
+// The names near word ("did you mean"), by the rules of util::NearestNames' defaults.
 KITBASE_API std::vector<std::string> NearestNames(const std::string& word,
                                                   const std::vector<std::string>& candidates);
-// User text for a one-line message: in single quotes, control characters written as \n, \t or
-// \xNN, and cut to about 80 columns with "..." when longer.
-KITBASE_API std::string Quote(const std::string& text);
 
 // Each name in single quotes, for listing names in a message.
 KITBASE_API std::vector<std::string> QuoteEach(const std::vector<std::string>& names);

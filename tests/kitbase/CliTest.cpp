@@ -1,6 +1,8 @@
 // quarncli as a process, against the test plug-ins: listings, help, suggestions, parsing, the
 // ways a command ends (exit statuses 0, 1 and 2 with their stdout and stderr), formatter choice,
 // global options and broken plug-ins.
+#include "cli/Cli.h"
+#include "support/Files.h"
 #include "support/Process.h"
 
 #include <gtest/gtest.h>
@@ -8,6 +10,8 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <fcntl.h>
+#include <unistd.h>
 #include <map>
 #include <optional>
 #include <sstream>
@@ -68,7 +72,9 @@ TEST(Cli, NamespaceListsItsChildrenWithDescriptions) {
               "  ravel      Throws a host-control exception.\n"
               "  crash      Throws a standard exception.\n"
               "  hoststate  Show QUARN_HOST_STATE.\n"
-              "  disks      List the disks.\n",
+              "  disks      List the disks.\n"
+              "  clash      Takes options named like global ones.\n"
+              "  raw        Returns and reports raw host text.\n",
               outcome.out);
     EXPECT_EQ(outcome.out, Quarncli({"kb", "--help"}).out);
     EXPECT_EQ(outcome.out, Quarncli({"--help", "kb"}).out);
@@ -76,7 +82,7 @@ TEST(Cli, NamespaceListsItsChildrenWithDescriptions) {
     Outcome root = Quarncli({});
     EXPECT_EQ(0, root.status);
     EXPECT_NE(std::string::npos, root.out.find("\nAvailable namespaces:\n  kb  Commands of"));
-    EXPECT_NE(std::string::npos, root.out.find("\nGlobal options (before the command words):\n"));
+    EXPECT_NE(std::string::npos, root.out.find("\nGlobal options (before or after the command words):\n"));
     EXPECT_NE(std::string::npos, root.out.find("  --format-param KEY=VALUE  "));
 }
 
@@ -142,9 +148,8 @@ TEST(Cli, UsageErrorsExitWithStatus2AndOneLine) {
               UsageError({"kb", "echo", "-f", "stray"}));
     EXPECT_EQ("quarncli: option --big takes a decimal integer, got '1e3'\n",
               UsageError({"kb", "echo", "--big", "1e3"}));
-    // Global options belong before the command words.
-    EXPECT_EQ(0u, UsageError({"kb", "echo", "--formatter", "json"})
-                      .find("quarncli: unknown option '--formatter'"));
+    EXPECT_EQ("quarncli: unknown option '--formater'; did you mean '--formatter'?\n",
+              UsageError({"kb", "echo", "--formater", "json"}));
     EXPECT_EQ("quarncli: unexpected '--bogus' after 'kb deep', which is a namespace: name one of "
               "its commands (run 'quarncli kb deep' to list them)\n",
               UsageError({"kb", "deep", "--bogus"}));
@@ -156,7 +161,7 @@ TEST(Cli, UnknownWordsNameTheNearestChildrenOrAllOfThem) {
     EXPECT_EQ("quarncli: unknown command 'dep' under 'kb'; did you mean 'deep'?\n",
               UsageError({"kb", "dep", "deeper"}));
     EXPECT_EQ("quarncli: unknown command 'qqqqqq' under 'kb'; valid: echo, need, fail, partial, "
-              "ravel, crash, hoststate, disks and deep\n",
+              "ravel, crash, hoststate, disks, clash, raw and deep\n",
               UsageError({"kb", "qqqqqq"}));
     EXPECT_EQ("quarncli: unknown command 'KB'; did you mean 'kb'?\n", UsageError({"KB"}));
     EXPECT_EQ("quarncli: unknown command 'dne' under 'kb deep deeper'; did you mean 'done'?\n",
@@ -329,6 +334,133 @@ TEST(Cli, VersionAndWriteFailures) {
     EXPECT_EQ("Partly done: 1 of 2 items failed\n"
               "quarncli: cannot write the output: No space left on device\n",
               partial.err);
+}
+
+TEST(Cli, GlobalOptionsMayFollowThePath) {
+    nlohmann::json echo = nlohmann::json::parse(
+        Quarncli({"kb", "echo", "-n", "x", "--formatter", "json", "-f"}).out);
+    EXPECT_EQ("x", echo["name.string"]);
+    EXPECT_EQ(true, echo["force.flag"]);
+    EXPECT_EQ("root     true\nscratch  false\n",
+              Quarncli({"kb", "disks", "--format-param=table-columns=Name,Mounted",
+                        "--format-param", "show-header:Disk=no"})
+                  .out);
+    EXPECT_EQ("/after\n", Quarncli({"kb", "hoststate", "--host-state", "/after"}).out);
+    // Also the plug-in directory, and after a namespace's words.
+    Outcome listed = QuarncliRaw({"kb", "deep", "--plugin-dir", KB_GOOD_PLUGINS, "--formatter=csv"});
+    EXPECT_EQ(0, listed.status) << listed.err;
+    EXPECT_EQ("Name,Kind,Description\r\ndeeper,namespace,Three levels down.\r\n", listed.out);
+    EXPECT_EQ("kb deep", nlohmann::json::parse(Quarncli({"kb", "deep", "--schema"}).out)["path"]);
+    EXPECT_EQ("quarncli: global option '--formatter' is given more than once\n",
+              UsageError({"--formatter", "json", "kb", "echo", "--formatter", "xml"}));
+    EXPECT_EQ("quarncli: global option '--formatter' needs a value\n",
+              UsageError({"kb", "echo", "--formatter"}));
+}
+
+TEST(Cli, ACommandsOwnOptionWinsOverTheGlobalOneOfItsName) {
+    Outcome clash = Quarncli({"kb", "clash", "--formatter", "mine", "--plugin-dir=/mine"});
+    EXPECT_EQ(0, clash.status) << clash.err;
+    EXPECT_EQ("formatter=mine plugin-dir=/mine\n", clash.out);
+    // Read as global at first, --plugin-dir turns out to be the command's: the tree is built
+    // again from the default directory, which has no "kb".
+    Outcome rebuilt = QuarncliRaw({"kb", "clash", "--plugin-dir", KB_GOOD_PLUGINS});
+    EXPECT_EQ(2, rebuilt.status);
+    EXPECT_EQ(0u, rebuilt.err.find("quarncli: unknown command 'kb'")) << rebuilt.err;
+}
+
+TEST(Cli, FormatParamsAreCheckedBeforeTheCommandRuns) {
+    // "kb fail" would print its errors; a refused setting stops it first.
+    EXPECT_EQ("quarncli: global option '--format-param': unknown key 'foo'; keys are "
+              "fields:<Struct>, show-header:<Struct>, table-columns, units:<Struct>.<Field> and "
+              "wrap-last\n",
+              UsageError({"--format-param", "foo=bar", "kb", "fail"}));
+    EXPECT_EQ("quarncli: global option '--format-param': unknown field 'size' in 'fields:Disk'; "
+              "the fields of Disk are Name, Size, Mounted and Note; did you mean 'Size'?\n",
+              UsageError({"kb", "disks", "--format-param", "fields:Disk=Name,size"}));
+    EXPECT_EQ("quarncli: global option '--format-param': 'show-header:Disk' takes true, false, "
+              "yes, no, 1 or 0, got 'maybe'\n",
+              UsageError({"kb", "disks", "--format-param", "show-header:Disk=maybe"}));
+    // A namespace listing has the shape of its children.
+    EXPECT_EQ(0u, UsageError({"--formatter", "json", "--format-param", "fields:Disk=Name", "kb"})
+                      .find("quarncli: global option '--format-param': unknown structure 'Disk' "
+                            "in 'fields:Disk'; this command's structures are Child"));
+}
+
+TEST(Cli, NamespaceListingsHonourTheFormatter) {
+    nlohmann::json children = nlohmann::json::parse(Quarncli({"--formatter", "json", "kb"}).out);
+    ASSERT_EQ(11u, children.size());
+    EXPECT_EQ((nlohmann::json{{"Name", "echo"},
+                              {"Kind", "command"},
+                              {"Description", "Echo what the input answers for every kind."}}),
+              children[0]);
+    EXPECT_EQ("namespace", children[10]["Kind"]);
+    EXPECT_EQ("Name    Kind       Description\n"
+              "------  ---------  ------------------\n"
+              "deeper  namespace  Three levels down.\n",
+              Quarncli({"--formatter", "table", "kb", "deep"}).out);
+    EXPECT_EQ("Child[0].Name=deeper\nChild[0].Kind=namespace\n"
+              "Child[0].Description=Three levels down.\n",
+              Quarncli({"kb", "deep", "--formatter", "keyvalue"}).out);
+    EXPECT_EQ("   Name: deeper\n",
+              Quarncli({"--formatter", "simple", "--format-param", "fields:Child=Name",
+                        "--format-param", "show-header:Child=false", "kb", "deep"})
+                  .out);
+}
+
+TEST(Cli, HostTextIsEscapedInOutputAndMessages) {
+    Outcome raw = Quarncli({"kb", "raw"});
+    EXPECT_EQ(1, raw.status);
+    EXPECT_EQ("Raw:\n   Text: one\\nRaw:\\n   Text: forged\\x1b[2J\n", raw.out);
+    // One line per message, in order, nothing raw.
+    EXPECT_EQ("fault: disk\\nquarncli: all is well\\x1b[0m\nsecond\n", raw.err);
+    EXPECT_EQ("Raw.Text=one\\nRaw:\\n   Text: forged\\x1b[2J\n",
+              Quarncli({"kb", "raw", "--formatter", "keyvalue"}).out);
+    EXPECT_EQ("Text\r\n\"one\nRaw:\n   Text: forged\x1b[2J\"\r\n",
+              Quarncli({"kb", "raw", "--formatter", "csv"}).out);
+    EXPECT_EQ("one\nRaw:\n   Text: forged\x1b[2J",
+              nlohmann::json::parse(Quarncli({"kb", "raw", "--formatter", "json"}).out)["Text"]);
+}
+
+// Runs quarncli's logic in this process with the program's location unreadable.
+Outcome RunWithoutProgramLocation(const std::vector<std::string>& args) {
+    testsupport::TempDir dir;
+    int out = open((dir / "out").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+    int err = open((dir / "err").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
+    Kitbase::Cli::RunSettings settings;
+    settings.exeLink = "/nonexistent/exe";
+    Outcome outcome;
+    outcome.status = Kitbase::Cli::Run(args, out, err, settings);
+    close(out);
+    close(err);
+    outcome.out = testsupport::ReadFile(dir / "out");
+    outcome.err = testsupport::ReadFile(dir / "err");
+    return outcome;
+}
+
+TEST(Cli, AnUnreadableProgramLocationLoadsNoPluginsFromElsewhere) {
+    Outcome lost = RunWithoutProgramLocation({"kb", "deep"});
+    EXPECT_EQ(1, lost.status);
+    EXPECT_EQ("", lost.out);
+    EXPECT_EQ("quarncli: cannot find the plug-in directory: the program's location "
+              "(/nonexistent/exe) cannot be read: No such file or directory; give --plugin-dir "
+              "DIR\n",
+              lost.err);
+    Outcome given = RunWithoutProgramLocation({"--plugin-dir", KB_GOOD_PLUGINS, "kb", "deep",
+                                               "deeper", "done"});
+    EXPECT_EQ(0, given.status) << given.err;
+    EXPECT_EQ("true\n", given.out);
+}
+
+TEST(Cli, EveryOutputFailsWithStatus1WhenItCannotBeWritten) {
+    for (const std::vector<std::string>& args : std::vector<std::vector<std::string>>{
+             {"--version"}, {"--help"}, {"kb"}, {"--formatter", "json", "kb"}, {"--schema"},
+             {"kb", "echo", "--help"}}) {
+        std::vector<std::string> all = {"--plugin-dir", KB_GOOD_PLUGINS};
+        all.insert(all.end(), args.begin(), args.end());
+        Outcome full = QuarncliRaw(all, {}, "/dev/full");
+        EXPECT_EQ(1, full.status) << args[0];
+        EXPECT_EQ("quarncli: cannot write the output: No space left on device\n", full.err);
+    }
 }
 
 }  // namespace

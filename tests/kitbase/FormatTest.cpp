@@ -215,19 +215,42 @@ TEST_F(FormatTest, TableWithoutHeaderSingleStructAndEmptyList) {
 
 TEST_F(FormatTest, TableKeepsCellsOnOneLineAndCountsCodePoints) {
     ListPtr rows = MetaList::New(MetaTypeStruct);
-    const char* names[] = {"\xC3\xA9t\xC3\xA9", "tab\there", "line\nbreak"};
+    const char* names[] = {"\xC3\xA9t\xC3\xA9", "tab\there", "line\nbreak", "\x1b[2Jgone"};
     for (const char* name : names) {
         StructPtr row = MetaStruct::New("Row");
         row->SetField("Name", name);
         row->SetField("N", 1);
         rows->AddStruct(row);
     }
-    EXPECT_EQ("Name        N\n"
-              "----------  -\n"
-              "\xC3\xA9t\xC3\xA9         1\n"
-              "tab here    1\n"
-              "line break  1\n",
+    // Control characters show escaped, and the columns are as wide as what shows.
+    EXPECT_EQ("Name         N\n"
+              "-----------  -\n"
+              "\xC3\xA9t\xC3\xA9          1\n"
+              "tab\\there    1\n"
+              "line\\nbreak  1\n"
+              "\\x1b[2Jgone  1\n",
               Render("table", *rows));
+}
+
+// Host data with control characters cannot forge lines or reach the terminal raw.
+TEST_F(FormatTest, HostTextIsEscapedInSimpleAndKeyValueAndQuotedInCsv) {
+    StructPtr nic = MetaStruct::New("Nic");
+    nic->SetField("Name", "eth0\nNic:\n   Name: forged");
+    nic->SetField("Note", "bell\a tab\t esc\x1b[0m back\\slash \xFF");
+    EXPECT_EQ("Nic:\n"
+              "   Name: eth0\\nNic:\\n   Name: forged\n"
+              "   Note: bell\\x07 tab\\t esc\\x1b[0m back\\slash \\xff\n",
+              Render("simple", *nic));
+    EXPECT_EQ("Nic.Name=eth0\\nNic:\\n   Name: forged\n"
+              "Nic.Note=bell\\x07 tab\\t esc\\x1b[0m back\\\\slash \\xff\n",
+              Render("keyvalue", *nic));
+    EXPECT_EQ("Name,Note\r\n"
+              "\"eth0\nNic:\n   Name: forged\",bell\a tab\t esc\x1b[0m back\\slash \xFF\r\n",
+              Render("csv", *nic));
+    ListPtr lines = MetaList::New(MetaTypeString);
+    lines->AddString("one\ntwo");
+    EXPECT_EQ("one\\ntwo\n", Render("simple", *lines));
+    EXPECT_EQ("\"one\ntwo\"\r\n", Render("csv", *lines));
 }
 
 ListPtr Descriptions() {
@@ -253,12 +276,83 @@ TEST_F(FormatTest, TableWrapsTheLastColumnToTheWidth) {
               "c     abcdefghijklmnopqrstuvwx\n"
               "      yzABCD\n",
               Render("table", *Descriptions(), nullptr, Params({{"wrap-last", "true"}}), 30));
-    // Without wrap-last, or when the column fits, rows stay whole.
-    std::string whole = Render("table", *Descriptions(), nullptr, FormatParams(), 30);
+    // When the table fits, wrap-last changes nothing.
+    std::string whole = Render("table", *Descriptions(), nullptr, FormatParams(), 200);
     EXPECT_NE(std::string::npos,
               whole.find("a     one two three four five six seven eight nine ten\n"));
     EXPECT_EQ(whole, Render("table", *Descriptions(), nullptr, Params({{"wrap-last", "true"}}),
                             200));
+}
+
+// Network cards: a heading of two words, MAC addresses (one token each) and a long note.
+ListPtr Nics() {
+    ListPtr rows = MetaList::New(MetaTypeStruct);
+    const char* text[][4] = {
+        {"vmnic0", "00:50:56:a1:b2:c3", "Up", "Uplink to the management network, team A"},
+        {"vmnic1", "00:50:56:a1:b2:c4", "Down", "Spare"}};
+    for (auto& nic : text) {
+        StructPtr row = MetaStruct::New("Nic");
+        row->SetField("Name", nic[0]);
+        row->SetField("MAC Address", nic[1]);
+        row->SetField("Link State", nic[2]);
+        row->SetField("Description", nic[3]);
+        rows->AddStruct(row);
+    }
+    return rows;
+}
+
+// Every line within width; with no token split unless it alone is wider than its column.
+void ExpectFitted(const std::string& table, std::size_t width) {
+    std::size_t start = 0;
+    while (start < table.size()) {
+        std::size_t end = table.find('\n', start);
+        EXPECT_LE(end - start, width) << table.substr(start, end - start);
+        start = end + 1;
+    }
+    EXPECT_EQ(std::string::npos, table.find("00:50:56:a1\n")) << table;
+}
+
+TEST_F(FormatTest, WideTablesAreFittedToTheWidthAtWordBoundaries) {
+    std::string fitted = Render("table", *Nics(), nullptr, FormatParams(), 60);
+    EXPECT_EQ("Name    MAC Address        Link State  Description\n"
+              "------  -----------------  ----------  -------------------\n"
+              "vmnic0  00:50:56:a1:b2:c3  Up          Uplink to the\n"
+              "                                       management network,\n"
+              "                                       team A\n"
+              "vmnic1  00:50:56:a1:b2:c4  Down        Spare\n",
+              fitted);
+    ExpectFitted(fitted, 60);
+    // Narrower: every column short of its width shares what is left, headings wrap too.
+    std::string shared = Render("table", *Nics(), nullptr, FormatParams(), 50);
+    EXPECT_EQ("Name    MAC Address        Link   Description\n"
+              "                           State\n"
+              "------  -----------------  -----  ----------------\n"
+              "vmnic0  00:50:56:a1:b2:c3  Up     Uplink to the\n"
+              "                                  management\n"
+              "                                  network, team A\n"
+              "vmnic1  00:50:56:a1:b2:c4  Down   Spare\n",
+              shared);
+    ExpectFitted(shared, 50);
+    // wrap-last: the last column gives way first, so the others keep their width.
+    std::string last = Render("table", *Nics(), nullptr, Params({{"wrap-last", "yes"}}), 50);
+    EXPECT_EQ("Name    MAC Address        Link State  Description\n"
+              "------  -----------------  ----------  -----------\n"
+              "vmnic0  00:50:56:a1:b2:c3  Up          Uplink to\n"
+              "                                       the\n"
+              "                                       management\n"
+              "                                       network,\n"
+              "                                       team A\n"
+              "vmnic1  00:50:56:a1:b2:c4  Down        Spare\n",
+              last);
+    ExpectFitted(last, 50);
+    // So narrow that the words cannot all fit: columns share the width, long tokens split.
+    std::string narrow = Render("table", *Nics(), nullptr, FormatParams(), 30);
+    std::size_t start = 0;
+    while (start < narrow.size()) {
+        std::size_t end = narrow.find('\n', start);
+        EXPECT_LE(end - start, 30u) << narrow;
+        start = end + 1;
+    }
 }
 
 // ---- csv ----

@@ -135,6 +135,15 @@ TEST_F(OptionParserTest, UnknownOptionsNameTheNearestOrAllValidOnes) {
     EXPECT_EQ(0u, Refusal({"--"}).find("unexpected argument '--'"));
     EXPECT_EQ("unknown option '--x'; this command takes no options",
               ParseOptions(*InputSpec::New(), {"--x"}).error);
+    // Names valid elsewhere on the line (the global options) are suggested, never accepted.
+    EXPECT_EQ("unknown option '--formater'; did you mean '--formatter'?",
+              ParseOptions(*spec, {"--formater", "json"}, {"--formatter", "--schema"}).error);
+    EXPECT_EQ("unknown option '--formater'; did you mean '--formatter'?",
+              ParseOptions(*InputSpec::New(), {"--formater"}, {"--formatter"}).error);
+    // User text in the refusal is quoted: escaped, and cut when long.
+    std::string echoed = Refusal({std::string("--\x1b[2J\n") + std::string(131072, 'v')});
+    EXPECT_LT(echoed.size(), 200u);
+    EXPECT_EQ(0u, echoed.find("unknown option '--\\x1b[2J\\nvvv"));
 }
 
 TEST_F(OptionParserTest, RepeatedOptionsAreRefusedWhateverTheSpelling) {
@@ -153,6 +162,12 @@ TEST_F(OptionParserTest, MissingValues) {
         "option --count (-c) needs a value (an integer from 1 to 10); write --count=VALUE for a "
         "value starting with '-'",
         Refusal({"-c", "-f"}));
+    // The bare "--" is never a value, in either spelling; the '=' form still passes it.
+    const std::string dashes = "option --name (-n) needs a value (a text value); write "
+                               "--name=VALUE for a value starting with '-'";
+    EXPECT_EQ(dashes, Refusal({"--name", "--"}));
+    EXPECT_EQ(dashes, Refusal({"-n", "--", "x"}));
+    EXPECT_EQ("--", Accepted({"--name=--"})->GetString("name"));
 }
 
 TEST_F(OptionParserTest, StrayPositionalWordsAreRefused) {

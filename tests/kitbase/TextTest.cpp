@@ -70,29 +70,16 @@ TEST(Text, ParseBoolTakesSixSpellingsInAnyCase) {
     }
 }
 
-TEST(Text, Utf8SequencesAreCheckedStrictly) {
-    auto length = [](const std::string& bytes) {
-        return Utf8SequenceLength(reinterpret_cast<const unsigned char*>(bytes.data()),
-                                  bytes.size());
-    };
-    EXPECT_EQ(1u, length("a"));
-    EXPECT_EQ(2u, length("\xC3\xA9"));          // é
-    EXPECT_EQ(3u, length("\xE2\x82\xAC"));      // €
-    EXPECT_EQ(4u, length("\xF0\x9F\x98\x80"));  // emoji
-    EXPECT_EQ(0u, length("\x80"));              // stray continuation
-    EXPECT_EQ(0u, length("\xC0\xAF"));          // overlong
-    EXPECT_EQ(0u, length("\xE0\x80\xAF"));      // overlong
-    EXPECT_EQ(0u, length("\xED\xA0\x80"));      // surrogate
-    EXPECT_EQ(0u, length("\xF4\x90\x80\x80"));  // beyond U+10FFFF
-    EXPECT_EQ(0u, length("\xE2\x82"));          // cut short
-    EXPECT_EQ(0u, length("\xFF"));
+TEST(Text, DisplayWidthCountsCodePoints) {
     EXPECT_EQ(3u, DisplayWidth("a\xC3\xA9\xE2\x82\xAC"));
+    EXPECT_EQ(8u, EscapedWidth("a\tb\x1b", 4));  // the escapes are what shows
 }
 
 TEST(Text, JsonStringsAreEscapedAndAlwaysValid) {
     EXPECT_EQ("\"plain\"", Json("plain"));
     EXPECT_EQ("\"q\\\"b\\\\\"", Json("q\"b\\"));
-    EXPECT_EQ("\"\\u000a\\u000d\\u0009\\u0008\\u000c\\u0001\\u001f\"", Json("\n\r\t\b\f\x01\x1f"));
+    // The short escapes where JSON has them, \u00XX for the other control characters.
+    EXPECT_EQ("\"\\n\\r\\t\\b\\f\\u0001\\u001b\\u001f\"", Json("\n\r\t\b\f\x01\x1b\x1f"));
     EXPECT_EQ("\"\xC3\xA9\"", Json("\xC3\xA9"));
     // Each byte that is not well-formed UTF-8 becomes U+FFFD; the rest is kept.
     EXPECT_EQ("\"a\xEF\xBF\xBD" "b\xEF\xBF\xBD(\"", Json("a\xFF" "b\xC3" "\x28"));
@@ -129,33 +116,10 @@ TEST(Text, CommaListsAreTrimmed) {
     EXPECT_TRUE(SplitCommaList(" , ").empty());
 }
 
-TEST(Text, SuggestionsFindTyposTranspositionsAndPrefixes) {
-    std::vector<std::string> children = {"boot", "settings", "module", "coredump", "version",
-                                         "maintenanceMode", "mirafs"};
-    EXPECT_EQ(1u, EditDistance("verison", "version"));
-    EXPECT_EQ(0u, EditDistance("MODULE", "module"));
-    EXPECT_EQ(3u, EditDistance("", "abc"));
-    EXPECT_EQ((std::vector<std::string>{"version"}), NearestNames("verison", children));
-    EXPECT_EQ((std::vector<std::string>{"maintenanceMode"}),
-              NearestNames("maintenancemode", children));
-    EXPECT_EQ((std::vector<std::string>{"module"}), NearestNames("mod", children));
-    // A single letter is too short to guess from; two letters already name a prefix.
-    EXPECT_TRUE(NearestNames("m", {"module", "mirafs"}).empty());
-    EXPECT_EQ((std::vector<std::string>{"mirafs"}), NearestNames("mi", {"module", "mirafs"}));
-    // Only the nearest are named, in the candidates' order.
-    EXPECT_EQ((std::vector<std::string>{"set", "get"}),
-              NearestNames("bet", {"set", "list", "get"}));
-    EXPECT_TRUE(NearestNames("zzzzzz", children).empty());
-    EXPECT_TRUE(NearestNames("boo", {}).empty());
-}
-
-TEST(Text, QuoteKeepsMessagesOnOneLine) {
-    EXPECT_EQ("'abc'", Quote("abc"));
-    EXPECT_EQ("'a\\nb\\tc\\x01'", Quote("a\nb\tc\x01"));
-    std::string quoted = Quote(std::string(200, 'x'));
-    EXPECT_EQ("'" + std::string(80, 'x') + "...'", quoted);
+TEST(Text, NamesJoinForMessages) {
     EXPECT_EQ("a, b or c", JoinNames({"a", "b", "c"}, " or "));
     EXPECT_EQ("a", JoinNames({"a"}, " or "));
+    EXPECT_EQ((std::vector<std::string>{"'x'", "'\\n'"}), QuoteEach({"x", "\n"}));
 }
 
 TEST(Writer, LargeAndSmallPiecesArriveInOrder) {

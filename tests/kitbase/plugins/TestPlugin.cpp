@@ -188,6 +188,37 @@ void Disks(const InputPtr&, const OutputPtr& output) {
     output->Complete();
 }
 
+// ---- kb clash: options named like global ones, which stay the command's ----
+
+boost::shared_ptr<CallSpec::InputSpec> ClashInputs() {
+    boost::shared_ptr<CallSpec::InputSpec> spec = CallSpec::InputSpec::New();
+    spec->AddParameter(Param("formatter", nullptr, CallSpec::ParameterTypeString, false, "Mine"));
+    spec->AddParameter(Param("plugin-dir", nullptr, CallSpec::ParameterTypeString, false, "Mine"));
+    return spec;
+}
+
+void Clash(const InputPtr& input, const OutputPtr& output) {
+    output->SetResult(MetaObj::MetaString::New("formatter=" + input->GetString("formatter") +
+                                               " plugin-dir=" + input->GetString("plugin-dir")));
+    output->Complete();
+}
+
+// ---- kb raw: host text with line breaks and terminal escapes, in the result and messages ----
+
+boost::shared_ptr<MetaObj::MetaStruct> RawShape() {
+    boost::shared_ptr<MetaObj::MetaStruct> shape = MetaObj::MetaStruct::New("Raw");
+    shape->SetField("Text", MetaObj::MetaString::New());
+    return shape;
+}
+
+void Raw(const InputPtr&, const OutputPtr& output) {
+    boost::shared_ptr<MetaObj::MetaStruct> raw = MetaObj::MetaStruct::New("Raw");
+    raw->SetField("Text", "one\nRaw:\n   Text: forged\x1b[2J");
+    output->SetResult(raw);
+    output->SetError("fault: disk\nquarncli: all is well\x1b[0m");
+    output->SetError("second");
+}
+
 }  // namespace
 
 extern "C" __attribute__((visibility("default"))) void AutoCli_RegisterNamespaces(
@@ -227,6 +258,12 @@ extern "C" __attribute__((visibility("default"))) void AutoCli_RegisterNamespace
     disks->SetDefaultOutputParameter("table-columns", "Name,Size,Note");
     disks->SetDefaultOutputParameter("units:Disk.Size", "B");
     kb->RegisterNamespaceNode(disks, "disks");
+
+    kb->RegisterNamespaceNode(TestCommand::New("Takes options named like global ones.",
+                                               ClashInputs, MetaObj::MetaString::New(), Clash),
+                              "clash");
+    kb->RegisterNamespaceNode(
+        TestCommand::New("Returns and reports raw host text.", nullptr, RawShape(), Raw), "raw");
 
     boost::shared_ptr<AutoCli::NamespaceNode> deep = AutoCli::Namespace::New();
     deep->SetDescription("A namespace two levels down.");
