@@ -1,5 +1,7 @@
 #include <simhost/Mapping.h>
 
+#include <util/Text.h>
+
 #include <algorithm>
 
 namespace simhost {
@@ -22,41 +24,7 @@ void Location::Fail(const std::string& what) const {
     throw ScenarioError(path_.empty() ? "scenario: " + what : "scenario: " + path_ + ": " + what);
 }
 
-bool IsValidUtf8(const std::string& value) {
-    const auto* s = reinterpret_cast<const unsigned char*>(value.data());
-    std::size_t n = value.size();
-    for (std::size_t i = 0; i < n;) {
-        unsigned char c = s[i];
-        std::size_t len;
-        std::uint32_t cp;
-        if (c < 0x80) {
-            ++i;
-            continue;
-        } else if ((c & 0xE0) == 0xC0) {
-            len = 2;
-            cp = c & 0x1F;
-        } else if ((c & 0xF0) == 0xE0) {
-            len = 3;
-            cp = c & 0x0F;
-        } else if ((c & 0xF8) == 0xF0) {
-            len = 4;
-            cp = c & 0x07;
-        } else {
-            return false;
-        }
-        if (i + len > n) return false;
-        for (std::size_t k = 1; k < len; ++k) {
-            if ((s[i + k] & 0xC0) != 0x80) return false;
-            cp = (cp << 6) | (s[i + k] & 0x3F);
-        }
-        // Overlong forms, surrogates and values past U+10FFFF are not UTF-8.
-        if ((len == 2 && cp < 0x80) || (len == 3 && cp < 0x800) || (len == 4 && cp < 0x10000) ||
-            (cp >= 0xD800 && cp <= 0xDFFF) || cp > 0x10FFFF)
-            return false;
-        i += len;
-    }
-    return true;
-}
+bool IsValidUtf8(const std::string& value) { return quarn::util::IsValidUtf8(value); }
 
 std::string CheckText(const std::string& value, std::size_t max_bytes, bool allow_empty) {
     if (value.size() > max_bytes)

@@ -2,8 +2,9 @@
 
 #include <simhost/Events.h>
 
+#include <util/Text.h>
+
 #include <algorithm>
-#include <numeric>
 
 namespace simhost {
 namespace {
@@ -12,21 +13,6 @@ const OperationInfo kOperations[] = {
 #define OPERATION(Id, name, doc) {Op::Id, name, doc},
 #include <simhost/Registry.def>
 };
-
-std::size_t EditDistance(const std::string& a, const std::string& b) {
-    std::vector<std::size_t> row(b.size() + 1);
-    std::iota(row.begin(), row.end(), 0);
-    for (std::size_t i = 1; i <= a.size(); ++i) {
-        std::size_t diagonal = row[0];
-        row[0] = i;
-        for (std::size_t j = 1; j <= b.size(); ++j) {
-            std::size_t up = row[j];
-            row[j] = std::min({row[j] + 1, row[j - 1] + 1, diagonal + (a[i - 1] != b[j - 1])});
-            diagonal = up;
-        }
-    }
-    return row[b.size()];
-}
 
 // The class part of a qualified name ("NorlithCtl::System::SystemInfoImpl"), or "" for the
 // event library's free functions.
@@ -67,21 +53,15 @@ bool IsKnownOperation(const std::string& name) {
 }
 
 std::vector<std::string> NearestOperations(const std::string& name, std::size_t count) {
-    std::vector<std::pair<std::size_t, std::string>> scored;
-    for (const std::string& known : KnownOperations()) {
-        // A name given without its namespaces (e.g. "GetSystemUuid") is compared with the
-        // known names' same-length tails, so that it still finds its qualified form.
-        std::size_t distance = EditDistance(name, known);
-        if (known.size() > name.size())
-            distance = std::min(distance,
-                                EditDistance(name, known.substr(known.size() - name.size())) + 1);
-        scored.emplace_back(distance, known);
-    }
-    std::stable_sort(scored.begin(), scored.end(),
-                     [](const auto& a, const auto& b) { return a.first < b.first; });
-    std::vector<std::string> nearest;
-    for (std::size_t i = 0; i < scored.size() && i < count; ++i) nearest.push_back(scored[i].second);
-    return nearest;
+    // A name given without its namespaces (e.g. "GetSystemUuid") is compared with the known
+    // names' tails too, so that it still finds its qualified form.
+    quarn::util::NearestOptions options;
+    options.limited = false;
+    options.nearestOnly = false;
+    options.tails = true;
+    options.ignoreCase = false;
+    options.count = count;
+    return quarn::util::NearestNames(name, KnownOperations(), options);
 }
 
 std::string UnknownOperationText(const std::string& name) {
