@@ -28,6 +28,16 @@ public:
     // The MAC address of the stateless-boot NIC; "" when the host is not stateless.
     virtual std::string GetStatelessBootNicMacAddress();
 
+    // ---- welcome message
+
+    // ---- maintenance mode
+
+    // ---- keyboard layouts
+
+    // ---- modules and log levels
+
+    // ---- read cache
+
 private:
     SystemInfoImpl(const SystemInfoImpl&);
     SystemInfoImpl& operator=(const SystemInfoImpl&);

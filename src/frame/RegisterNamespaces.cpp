@@ -7,9 +7,24 @@
 // the framework owns the tree; nothing here keeps a reference.
 #include "frame/CommandModel.h"
 #include "frame/Export.h"
+// identity, time and console
 #include "identity/BootDeviceGet.h"
 #include "identity/UuidGet.h"
 #include "identity/VersionGet.h"
+// processes and security policy
+
+// SNMP agent
+
+// power and maintenance
+
+// kernel settings
+
+// kernel modules
+
+// core dump
+
+// memory file system
+
 
 #include <map>
 #include <string>
