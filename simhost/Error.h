@@ -5,7 +5,8 @@
 // user sees; the host-control library turns it into Ravel::Lib::RavelException at its boundary.
 // ScenarioError is a HostError raised while a scenario is parsed or validated; its text starts
 // with "scenario: " and the JSON location of the first problem. HostExists refuses to create a
-// host over an existing one.
+// host over an existing one. HostDamaged says that a host's database file is damaged (truncated,
+// pages overwritten): the file is ours, but its contents cannot be trusted.
 #pragma once
 
 #include <simhost/Export.h>
@@ -29,6 +30,12 @@ public:
 class SIMHOST_API HostExists : public HostError {
 public:
     explicit HostExists(const std::string& message) : HostError(message) {}
+};
+
+// Raised when a host's database file is damaged.
+class SIMHOST_API HostDamaged : public HostError {
+public:
+    explicit HostDamaged(const std::string& message) : HostError(message) {}
 };
 
 }  // namespace simhost

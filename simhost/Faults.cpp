@@ -45,4 +45,9 @@ std::vector<Fault> ReadFaults(Db& db) {
 
 void DeleteFaults(Db& db) { db.Cached("DELETE FROM faults")->Run(); }
 
+bool DeleteFault(Db& db, const std::string& operation) {
+    db.Cached("DELETE FROM faults WHERE operation = ?1")->Bind(1, operation).Run();
+    return db.Changes() > 0;
+}
+
 }  // namespace simhost

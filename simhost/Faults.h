@@ -40,5 +40,7 @@ SIMHOST_API std::string CheckFault(const Fault& fault);
 SIMHOST_API void StoreFault(Db& db, const Fault& fault);  // replaces any fault on the same operation
 SIMHOST_API std::vector<Fault> ReadFaults(Db& db);         // sorted by operation
 SIMHOST_API void DeleteFaults(Db& db);
+// Removes the fault on operation; false when none was set.
+SIMHOST_API bool DeleteFault(Db& db, const std::string& operation);
 
 }  // namespace simhost

@@ -129,14 +129,14 @@ TEST_F(StoreTest, CorruptOrForeignDatabasesAreRefusedAndLeftAlone) {
 
     std::filesystem::create_directories(dir / "foreign");
     {
-        simhost::Db foreign(dir / "foreign/host.db", true);
+        simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::Create);
         foreign.Exec("CREATE TABLE accounts(name TEXT); INSERT INTO accounts VALUES ('x');");
     }
     message = ThrownBy([&] { UuidOf(dir / "foreign"); });
     EXPECT_NE(message.find("is not a simulated host database"), std::string::npos) << message;
     EXPECT_THROW(simhost::Host(dir / "foreign").Init(simhost::DefaultScenario(), true),
                  simhost::HostError);
-    simhost::Db foreign(dir / "foreign/host.db");
+    simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::ReadOnly);
     EXPECT_EQ(foreign.QueryInt("SELECT count(*) FROM accounts"), 1);
 }
 
@@ -145,7 +145,7 @@ TEST_F(StoreTest, OtherSchemaVersionIsRefusedUntilReplaced) {
     simhost::Host host(dir / "h");
     host.Init();
     {
-        simhost::Db db(simhost::DatabasePath(host.Dir()));
+        simhost::Db db(simhost::DatabasePath(host.Dir()), simhost::Db::Mode::ReadWrite);
         db.Exec("PRAGMA user_version=7; DROP TABLE observations;");
     }
     std::string message = ThrownBy([&] { UuidOf(host.Dir()); });
@@ -161,7 +161,7 @@ TEST_F(StoreTest, AProcessKilledInsideAWriteLeavesTheLastCommittedState) {
     std::string path = simhost::DatabasePath(host.Dir());
     int pid = testsupport::ForkChild(
         [](void* context) {
-            simhost::Db db(*static_cast<std::string*>(context));
+            simhost::Db db(*static_cast<std::string*>(context), simhost::Db::Mode::ReadWrite);
             db.Exec("BEGIN IMMEDIATE; DELETE FROM identity;"
                     "INSERT INTO observations(time, message) VALUES ('x', 'half');");
             raise(SIGKILL);
