@@ -211,15 +211,17 @@ void Program::AddFaultAdd(CLI::App& parent) {
     CLI::App* command = parent.add_subcommand(
         "add", "Make an operation fail with a message, always or the next N times");
     actions_[command] = [this, command, options] {
+        if (options->message.empty() && command->count("MESSAGE") == 0)
+            Usage("fault add needs an OPERATION and a MESSAGE");
         std::optional<std::int64_t> times;
         if (command->count("--times"))
             times = WholeNumber("--times", options->times, 1, kMaxFaultTimes);
         const std::string& operation = KnownOperation(options->operation);
         CheckedHost().AddFault(operation, options->message, times);
     };
-    command->add_option("OPERATION", options->operation, "Fully qualified operation name")->required();
-    command->add_option("MESSAGE", options->message, "The error message the operation raises")
-        ->required();
+    // Required, but checked by the action: an unknown option is the better message.
+    command->add_option("OPERATION", options->operation, "Fully qualified operation name");
+    command->add_option("MESSAGE", options->message, "The error message the operation raises");
     command->add_option("--times", options->times, "Fail the next N calls only (1 to 1000000000)")
         ->type_name("N");
 }
@@ -322,12 +324,16 @@ std::string Choices(const CLI::App& app) {
 // Words no command took: an unknown option, command or argument, or a missing command.
 void Program::RefuseLeftovers() const {
     for (const CLI::App* app = &app_;; app = app->get_subcommands().front()) {
+        // CLI11 keeps the "--" that ended the options among the leftovers.
         std::vector<std::string> left = app->remaining();
+        auto end_of_options = std::find(left.begin(), left.end(), "--");
+        bool option = end_of_options != left.begin() && !left.empty() && left.front().size() > 1 &&
+                      left.front()[0] == '-';
+        if (end_of_options != left.end()) left.erase(end_of_options);
         bool is_group = !app->get_subcommands({}).empty();
         std::string name = CommandName(*app);
         std::string where = name.empty() ? "" : " for " + name;
-        if (!left.empty() && left.front().size() > 1 && left.front()[0] == '-')
-            Usage("unknown option '" + left.front() + "'" + where);
+        if (option) Usage("unknown option '" + left.front() + "'" + where);
         if (!left.empty() && is_group)
             Usage("unknown " + (name.empty() ? std::string("command") : name + " action") + " '" +
                   left.front() + "' (expected " + Choices(*app) + ")");
