@@ -121,7 +121,8 @@ void Db::Open() {
         // WAL with NORMAL keeps every committed transaction across a killed process.
         Exec(mode_ == Mode::ReadOnly
                  ? std::string(kConnectionSettings)
-                 : std::string(kConnectionSettings) + ";PRAGMA synchronous=NORMAL");
+                 : std::string(kConnectionSettings) + ";PRAGMA synchronous=NORMAL",
+             "cannot open");
     } catch (...) {
         sqlite3_close_v2(db_);
         db_ = nullptr;
@@ -156,11 +157,11 @@ void Db::Damaged(const std::string& reason) const {
                       "); replace it with 'quarnhost init --force'");
 }
 
-void Db::Exec(const std::string& sql) {
+void Db::Exec(const std::string& sql, const std::string& what) {
     char* error = nullptr;
     int rc = sqlite3_exec(db_, sql.c_str(), nullptr, nullptr, &error);
     sqlite3_free(error);  // the same text as sqlite3_errmsg, which Fail reports
-    if (rc != SQLITE_OK) Fail(sqlite3_get_autocommit(db_) ? "cannot read" : "cannot write");
+    if (rc != SQLITE_OK) Fail(what);
 }
 
 Query Db::Cached(const std::string& sql) {
@@ -192,7 +193,7 @@ void WriteTxn::Commit() {
     open_ = false;
 }
 
-ReadTxn::ReadTxn(Db& db) : db_(db) { db_.Exec("BEGIN"); }
+ReadTxn::ReadTxn(Db& db) : db_(db) { db_.Exec("BEGIN", "cannot read"); }
 
 ReadTxn::~ReadTxn() { sqlite3_exec(db_.Handle(), "COMMIT", nullptr, nullptr, nullptr); }
 

@@ -92,8 +92,8 @@ public:
     Db(const Db&) = delete;
     Db& operator=(const Db&) = delete;
 
-    // Runs one or more statements without results.
-    void Exec(const std::string& sql);
+    // Runs one or more statements without results; a failure says `what` failed.
+    void Exec(const std::string& sql, const std::string& what = "cannot write");
     // The prepared statement for this SQL (prepared once per connection), ready for binding.
     Query Cached(const std::string& sql);
     // One integer read by a query returning a single row and column (e.g. a pragma).
