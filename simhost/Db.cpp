@@ -2,22 +2,38 @@
 
 #include <sqlite3.h>
 
+#include <mutex>
+#include <stdexcept>
+
 namespace simhost {
 namespace {
 
-[[noreturn]] void Fail(sqlite3* db, const std::string& what) {
-    std::string reason = db ? sqlite3_errmsg(db) : "out of memory";
-    throw HostError("simulated host database: " + what + ": " + reason);
+// SQLite is set up for what every user of this library is: a short-lived process that opens one
+// small database, reads a few rows and exits. Memory statistics cost a mutex and bookkeeping on
+// every allocation; lookaside and the page cache's initial bulk allocation are buffers that such
+// a process never amortises. Must run before SQLite initialises itself; this library links
+// SQLite privately, so nothing else in the process can have initialised it first.
+void ConfigureLibrary() {
+    static std::once_flag once;
+    std::call_once(once, [] {
+        sqlite3_config(SQLITE_CONFIG_MEMSTATUS, 0);
+        sqlite3_config(SQLITE_CONFIG_LOOKASIDE, 0, 0);
+        sqlite3_config(SQLITE_CONFIG_PAGECACHE, nullptr, 0, 0);
+        sqlite3_initialize();
+    });
 }
+
+// Keeps a handful of pages per connection: hosts are small and each process does little.
+constexpr const char* kConnectionSettings = "PRAGMA cache_size=-256";
 
 }  // namespace
 
-Stmt::Stmt(sqlite3* db, const std::string& sql) : db_(db) {
-    if (sqlite3_prepare_v3(db, sql.c_str(), static_cast<int>(sql.size()), SQLITE_PREPARE_PERSISTENT,
-                           &stmt_, nullptr) != SQLITE_OK) {
+Stmt::Stmt(Db& db, const std::string& sql) : db_(db) {
+    if (sqlite3_prepare_v3(db.Handle(), sql.c_str(), static_cast<int>(sql.size()),
+                           SQLITE_PREPARE_PERSISTENT, &stmt_, nullptr) != SQLITE_OK) {
         sqlite3_finalize(stmt_);
         stmt_ = nullptr;
-        Fail(db, "cannot prepare '" + sql + "'");
+        db.Fail("cannot read");
     }
 }
 
@@ -26,17 +42,17 @@ Stmt::~Stmt() { sqlite3_finalize(stmt_); }
 Stmt& Stmt::Bind(int index, const std::string& value) {
     if (sqlite3_bind_text(stmt_, index, value.data(), static_cast<int>(value.size()),
                           SQLITE_TRANSIENT) != SQLITE_OK)
-        Fail(db_, "cannot bind a value");
+        db_.Fail("cannot bind a value");
     return *this;
 }
 
 Stmt& Stmt::Bind(int index, std::int64_t value) {
-    if (sqlite3_bind_int64(stmt_, index, value) != SQLITE_OK) Fail(db_, "cannot bind a value");
+    if (sqlite3_bind_int64(stmt_, index, value) != SQLITE_OK) db_.Fail("cannot bind a value");
     return *this;
 }
 
 Stmt& Stmt::BindNull(int index) {
-    if (sqlite3_bind_null(stmt_, index) != SQLITE_OK) Fail(db_, "cannot bind a value");
+    if (sqlite3_bind_null(stmt_, index) != SQLITE_OK) db_.Fail("cannot bind a value");
     return *this;
 }
 
@@ -44,9 +60,8 @@ bool Stmt::Step() {
     int rc = sqlite3_step(stmt_);
     if (rc == SQLITE_ROW) return true;
     if (rc == SQLITE_DONE) return false;
-    std::string sql = sqlite3_sql(stmt_);
     sqlite3_reset(stmt_);
-    Fail(db_, "'" + sql + "' failed");
+    db_.Fail(sqlite3_stmt_readonly(stmt_) ? "cannot read" : "cannot write");
 }
 
 void Stmt::Run() {
@@ -71,16 +86,11 @@ std::int64_t Stmt::Int(int column) const { return sqlite3_column_int64(stmt_, co
 
 bool Stmt::IsNull(int column) const { return sqlite3_column_type(stmt_, column) == SQLITE_NULL; }
 
-Db::Db(const std::string& path, bool create) : path_(path) {
-    int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | (create ? SQLITE_OPEN_CREATE : 0);
-    int rc = sqlite3_open_v2(path.c_str(), &db_, flags, nullptr);
-    if (rc != SQLITE_OK) {
-        std::string reason = db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(rc);
-        sqlite3_close_v2(db_);
-        db_ = nullptr;
-        throw HostError(reason);
-    }
-    sqlite3_extended_result_codes(db_, 1);
+Db::Db(const std::string& path, Mode mode, bool no_follow, std::string shown_as)
+    : path_(path), mode_(mode), no_follow_(no_follow),
+      shown_as_(shown_as.empty() ? path : std::move(shown_as)) {
+    ConfigureLibrary();
+    Open();
 }
 
 Db::~Db() {
@@ -88,19 +98,76 @@ Db::~Db() {
     sqlite3_close_v2(db_);
 }
 
-void Db::Exec(const std::string& sql) {
-    char* error = nullptr;
-    if (sqlite3_exec(db_, sql.c_str(), nullptr, nullptr, &error) != SQLITE_OK) {
-        std::string reason = error ? error : sqlite3_errmsg(db_);
-        sqlite3_free(error);
-        throw HostError("simulated host database: " + reason);
+void Db::Open() {
+    int flags = SQLITE_OPEN_NOMUTEX | (no_follow_ ? SQLITE_OPEN_NOFOLLOW : 0);
+    if (mode_ == Mode::ReadOnly)
+        flags |= SQLITE_OPEN_READONLY;
+    else
+        flags |= SQLITE_OPEN_READWRITE | (mode_ == Mode::Create ? SQLITE_OPEN_CREATE : 0);
+    int rc = sqlite3_open_v2(path_.c_str(), &db_, flags, nullptr);
+    if (rc != SQLITE_OK) {
+        std::string reason = db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(rc);
+        sqlite3_close_v2(db_);
+        db_ = nullptr;
+        throw HostError("'" + shown_as_ + "': " + reason);
     }
+    sqlite3_extended_result_codes(db_, 1);
+    // Writers queue for each other instead of failing at once.
+    sqlite3_busy_timeout(db_, 10000);
+    // Keep the WAL file between processes: no file creation and removal per invocation.
+    int persist = 1;
+    sqlite3_file_control(db_, "main", SQLITE_FCNTL_PERSIST_WAL, &persist);
+    try {
+        // WAL with NORMAL keeps every committed transaction across a killed process.
+        Exec(mode_ == Mode::ReadOnly
+                 ? std::string(kConnectionSettings)
+                 : std::string(kConnectionSettings) + ";PRAGMA synchronous=NORMAL",
+             "cannot open");
+    } catch (...) {
+        sqlite3_close_v2(db_);
+        db_ = nullptr;
+        throw;
+    }
+}
+
+void Db::MakeWritable() {
+    if (mode_ != Mode::ReadOnly) return;
+    if (live_queries_ != 0 || !sqlite3_get_autocommit(db_))
+        throw std::logic_error("a read-only host connection cannot be made writable while in use");
+    cache_.clear();
+    sqlite3_close_v2(db_);
+    db_ = nullptr;
+    mode_ = Mode::ReadWrite;
+    Open();
+}
+
+void Db::Fail(const std::string& what) const {
+    int code = db_ ? sqlite3_extended_errcode(db_) : SQLITE_NOMEM;
+    std::string reason = db_ ? sqlite3_errmsg(db_) : sqlite3_errstr(SQLITE_NOMEM);
+    int primary = code & 0xff;
+    if (primary == SQLITE_CORRUPT || primary == SQLITE_NOTADB) Damaged(reason);
+    throw HostError("'" + shown_as_ + "': " + what + ": " + reason);
+}
+
+void Db::Damaged(const std::string& reason) const {
+    std::string line = reason;
+    for (char& c : line)
+        if (c == '\n' || c == '\r') c = ' ';
+    throw HostDamaged("'" + shown_as_ + "' is damaged (" + line +
+                      "); replace it with 'quarnhost init --force'");
+}
+
+void Db::Exec(const std::string& sql, const std::string& what) {
+    char* error = nullptr;
+    int rc = sqlite3_exec(db_, sql.c_str(), nullptr, nullptr, &error);
+    sqlite3_free(error);  // the same text as sqlite3_errmsg, which Fail reports
+    if (rc != SQLITE_OK) Fail(what);
 }
 
 Query Db::Cached(const std::string& sql) {
     auto it = cache_.find(sql);
-    if (it == cache_.end()) it = cache_.emplace(sql, std::make_unique<Stmt>(db_, sql)).first;
-    return Query(*it->second);
+    if (it == cache_.end()) it = cache_.emplace(sql, std::make_unique<Stmt>(*this, sql)).first;
+    return Query(*it->second, live_queries_);
 }
 
 std::int64_t Db::QueryInt(const std::string& sql) {
@@ -110,9 +177,12 @@ std::int64_t Db::QueryInt(const std::string& sql) {
 
 std::int64_t Db::LastInsertRowid() const { return sqlite3_last_insert_rowid(db_); }
 
-std::int64_t Db::Changes() const { return sqlite3_changes(db_); }
+int Db::Changes() const { return sqlite3_changes(db_); }
 
-WriteTxn::WriteTxn(Db& db) : db_(db) { db_.Exec("BEGIN IMMEDIATE"); }
+WriteTxn::WriteTxn(Db& db) : db_(db) {
+    db_.MakeWritable();
+    db_.Exec("BEGIN IMMEDIATE");
+}
 
 WriteTxn::~WriteTxn() {
     if (open_) sqlite3_exec(db_.Handle(), "ROLLBACK", nullptr, nullptr, nullptr);
@@ -123,7 +193,7 @@ void WriteTxn::Commit() {
     open_ = false;
 }
 
-ReadTxn::ReadTxn(Db& db) : db_(db) { db_.Exec("BEGIN"); }
+ReadTxn::ReadTxn(Db& db) : db_(db) { db_.Exec("BEGIN", "cannot read"); }
 
 ReadTxn::~ReadTxn() { sqlite3_exec(db_.Handle(), "COMMIT", nullptr, nullptr, nullptr); }
 

@@ -45,12 +45,16 @@ private:
     Event event_;
 };
 
-// Helpers for the two special kinds, so call sites read as what they mean.
+// Helpers for the special kinds, so call sites read as what they mean.
 inline HostError ScenarioError(const std::string& message) {
     return HostError(message, HostError::Code::kScenario);
 }
 inline HostError HostExists(const std::string& message) {
     return HostError(message, HostError::Code::kExists);
+}
+
+inline HostError HostDamaged(const std::string& message) {
+    return HostError(message, HostError::Code::kDamaged);
 }
 
 }  // namespace simhost

@@ -31,6 +31,11 @@ void Host::Init(const std::string& scenario_text, bool replace) {
     InitHost(dir_, scenario, replace ? InitMode::Replace : InitMode::CreateOnly);
 }
 
+void Host::Check() {
+    Session session = Session::Open(dir_);
+    CheckIntegrity(session.db());
+}
+
 std::string Host::Export() {
     Session session = Session::Open(dir_);
     ReadTxn snapshot(session.db());
@@ -69,9 +74,16 @@ std::vector<Fault> Host::Faults() {
 
 void Host::ClearFaults() { WriteHost(dir_, DeleteFaults); }
 
-std::vector<JournalEntry> Host::Journal() {
+void Host::ClearFault(const std::string& operation) {
+    if (!IsKnownOperation(operation)) throw HostError("unknown operation '" + operation + "'");
+    bool removed = false;
+    WriteHost(dir_, [&](Db& db) { removed = DeleteFault(db, operation); });
+    if (!removed) throw HostError("no fault is set on '" + operation + "'");
+}
+
+std::vector<JournalEntry> Host::Journal(std::optional<std::int64_t> last) {
     Session session = Session::Open(dir_);
-    return ReadJournal(session.db());
+    return ReadJournal(session.db(), last);
 }
 
 void Host::ClearJournal() { WriteHost(dir_, DeleteJournal); }

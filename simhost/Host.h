@@ -5,7 +5,9 @@
 // A Host names a state directory; each method opens that host through the process-wide
 // connection (creating it from the default scenario on first use, except Init) and works in
 // its own transaction. Everything throws HostError with a one-line message; Init's has code
-// kScenario for a bad scenario and kExists when a host is there and replace is false.
+// kScenario for a bad scenario and kExists when a host is there and replace is false; a damaged
+// database gives code kDamaged (Check finds damage anywhere in the file, the others only where
+// they read).
 #pragma once
 
 #include <simhost/Export.h>
@@ -40,6 +42,8 @@ public:
     // Creates the host from a scenario (validated first; nothing changes when it is refused).
     // With replace, an existing host's whole state (faults and journal included) is replaced.
     void Init(const std::string& scenario_text = DefaultScenario(), bool replace = false);
+    // Verifies the whole database file; throws HostDamaged when any part of it is damaged.
+    void Check();
     // The host's whole state as scenario text (faults included).
     std::string Export();
 
@@ -50,8 +54,12 @@ public:
                   std::optional<std::int64_t> times = std::nullopt, Event event = {});
     std::vector<Fault> Faults();
     void ClearFaults();
+    // Removes the fault set on operation; throws HostError when operation is unknown or has no
+    // fault.
+    void ClearFault(const std::string& operation);
 
-    std::vector<JournalEntry> Journal();
+    // The journal, oldest first; with last, only the last `last` entries.
+    std::vector<JournalEntry> Journal(std::optional<std::int64_t> last = std::nullopt);
     void ClearJournal();
 
 private:

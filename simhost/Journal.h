@@ -8,6 +8,7 @@
 #include <simhost/Export.h>
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -25,7 +26,9 @@ struct JournalEntry {
 
 SIMHOST_API void AppendJournal(Db& db, const std::string& kind, const std::string& operation,
                    const std::string& arguments);
-SIMHOST_API std::vector<JournalEntry> ReadJournal(Db& db);
+// The whole journal, oldest first; with last, only its last `last` entries (still oldest first).
+SIMHOST_API std::vector<JournalEntry> ReadJournal(Db& db,
+                                                  std::optional<std::int64_t> last = std::nullopt);
 SIMHOST_API void DeleteJournal(Db& db);
 
 }  // namespace simhost

@@ -1,16 +1,22 @@
 // The host store: where a host lives, how it is created, opened and replaced, and the one
 // process-wide connection the libraries share.
 //
-// A host is a directory: host.db (SQLite, WAL, our application id and schema version) and root/
-// (the host's own files). Creation builds the database under a temporary name and renames it
-// into place while holding DIR/host.lock, so a concurrent opener sees either no host or a whole
-// one. Replacement happens in one write transaction on the existing database, so other
-// processes' connections stay valid.
+// A host is a directory (created private to its owner): host.db (SQLite, WAL, our application
+// id and schema version) and root/ (the host's own files). host.db, host.lock and root/ must not
+// be symbolic links; a host.db that is not ours is refused before SQLite sees it, so nothing is
+// ever written to a foreign file. Creation and replacement happen while DIR/host.lock is held:
+// everything that can fail is prepared first (the database under a temporary name or in an
+// open transaction, the next root/ as DIR/root.new), then root/ and the database are switched
+// together, so a failure leaves the previous host as it was. Replacement of a sound host
+// happens in one write transaction on the existing database, so other processes' connections
+// stay valid and see the old host or the new one; a damaged one is rebuilt and renamed over.
 //
 // Session grants exclusive use of the process-wide connection (a recursive mutex is held for
-// the Session's lifetime). The connection is opened lazily for the directory asked for and
-// reopened when another directory is asked for, or after a fork. Everything here throws
-// HostError; opening failures read "Cannot open the simulated host at 'DIR': REASON".
+// the Session's lifetime). The connection is opened lazily, read-only, for the directory asked
+// for (it becomes read-write on its first write transaction) and reopened when another
+// directory is asked for, or after a fork. Creating a host on first use says so on standard
+// error. Everything here throws HostError; opening failures read "Cannot open the simulated
+// host at 'DIR': REASON", a damaged database is HostDamaged.
 #pragma once
 
 #include <simhost/Export.h>
@@ -44,6 +50,10 @@ enum class InitMode {
 // Creates or replaces the host in dir from a validated scenario. Returns true when it created
 // or replaced the host, false when OpenOrCreate found one.
 SIMHOST_API bool InitHost(const std::string& dir, const Scenario& scenario, InitMode mode);
+
+// Verifies the whole database file (SQLite's quick check); throws HostDamaged when it is damaged.
+// Costs a read of every page, so it is for administration, not for every operation.
+SIMHOST_API void CheckIntegrity(Db& db);
 
 class SIMHOST_API Session {
 public:

@@ -2,42 +2,26 @@
 
 #include <simhost/Host.h>
 #include <simhost/Store.h>
+#include <simhost/cli/Input.h>
 
+#include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <fstream>
+#include <functional>
 #include <iostream>
 #include <map>
+#include <memory>
 #include <optional>
-#include <sstream>
 #include <string>
 #include <vector>
 
 namespace simhost {
 namespace {
 
-const char kUsage[] =
-    "Usage: quarnhost [--state DIR] COMMAND [ARGUMENTS]\n"
-    "\n"
-    "Administers a simulated host. The host is DIR, else $QUARN_HOST_STATE, else\n"
-    "${XDG_STATE_HOME:-$HOME/.local/state}/quarncli/host.\n"
-    "\n"
-    "Commands:\n"
-    "  init [--scenario FILE] [--force]   create the host from the default scenario or FILE;\n"
-    "                                     --force replaces an existing host\n"
-    "  export                             print the host's state as a scenario\n"
-    "  fault add OPERATION MESSAGE [--times N]\n"
-    "                                     make OPERATION fail with MESSAGE, always or N times\n"
-    "  fault list                         show the faults: operation, message, calls left\n"
-    "  fault clear                        remove every fault\n"
-    "  journal [--clear]                  print the journal of changes and faults, or empty it\n"
-    "\n"
-    "Options:\n"
-    "  --state DIR   the host's state directory\n"
-    "  -h, --help    show this help\n";
+const char kVersion[] = "1.0.0";
 
 // A refusal: its one-line message and exit status.
 struct Refusal {
@@ -45,217 +29,370 @@ struct Refusal {
     std::string message;
 };
 
-[[noreturn]] void Usage(const std::string& message, bool point_to_help = true) {
-    throw Refusal{2, point_to_help ? message + " (see quarnhost --help)" : message};
-}
-
+[[noreturn]] void Usage(const std::string& message) { throw Refusal{2, message}; }
 [[noreturn]] void Failure(const std::string& message) { throw Refusal{1, message}; }
 
-// The words of one command: positional arguments and --name [VALUE] options.
-class Words {
-public:
-    Words(std::vector<std::string> words, std::string command)
-        : words_(std::move(words)), command_(std::move(command)) {}
-
-    // Splits the words against the options this command accepts; flags take no value.
-    void Parse(const std::vector<std::string>& valued, const std::vector<std::string>& flags) {
-        bool options_done = false;
-        for (std::size_t i = 0; i < words_.size(); ++i) {
-            const std::string& word = words_[i];
-            if (options_done || word.size() < 2 || word[0] != '-') {
-                positional_.push_back(word);
-                continue;
-            }
-            if (word == "--") {
-                options_done = true;
-                continue;
-            }
-            std::string name = word;
-            std::optional<std::string> value;
-            if (auto eq = word.find('='); eq != std::string::npos && word.rfind("--", 0) == 0) {
-                name = word.substr(0, eq);
-                value = word.substr(eq + 1);
-            }
-            bool takes_value = std::find(valued.begin(), valued.end(), name) != valued.end();
-            bool is_flag = std::find(flags.begin(), flags.end(), name) != flags.end();
-            if (!takes_value && !is_flag) Usage("unknown option '" + name + "' for " + command_);
-            if (options_.count(name)) Usage("option '" + name + "' given twice");
-            if (is_flag) {
-                if (value) Usage("option '" + name + "' takes no value");
-                options_[name] = "";
-                continue;
-            }
-            if (!value) {
-                if (i + 1 >= words_.size()) Usage("option '" + name + "' needs a value");
-                value = words_[++i];
-            }
-            options_[name] = *value;
-        }
-    }
-
-    void ExpectPositional(std::size_t count, const std::string& what) const {
-        if (positional_.size() < count) Usage(command_ + " needs " + what);
-        if (positional_.size() > count)
-            Usage("unexpected argument '" + positional_[count] + "' for " + command_);
-    }
-
-    const std::vector<std::string>& Positional() const { return positional_; }
-    bool Has(const std::string& option) const { return options_.count(option) != 0; }
-    const std::string& Option(const std::string& option) const { return options_.at(option); }
-
-private:
-    std::vector<std::string> words_;
-    std::string command_;
-    std::vector<std::string> positional_;
-    std::map<std::string, std::string> options_;
-};
-
-std::string ReadFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) Failure("cannot read '" + path + "': " + std::strerror(errno));
-    std::ostringstream text;
-    text << in.rdbuf();
-    if (in.bad()) Failure("cannot read '" + path + "'");
-    return text.str();
-}
-
-std::int64_t ParseTimes(const std::string& text) {
-    std::string problem =
-        "--times expects a whole number from 1 to " + std::to_string(kMaxFaultTimes) + ", not '" +
-        text + "'";
-    if (text.empty() || text.size() > 10) Usage(problem);
+// A whole number from min to max given to option, else a usage error.
+std::int64_t WholeNumber(const std::string& option, const std::string& text, std::int64_t min,
+                         std::int64_t max) {
+    std::string problem = option + " expects a whole number from " + std::to_string(min) +
+                          " to " + std::to_string(max) + ", not '" + text + "'";
+    if (text.empty() || text.size() > 18) Usage(problem);
     for (char c : text)
         if (c < '0' || c > '9') Usage(problem);
-    std::int64_t times = std::stoll(text);
-    if (times < 1 || times > kMaxFaultTimes) Usage(problem);
-    return times;
+    std::int64_t value = std::stoll(text);
+    if (value < min || value > max) Usage(problem);
+    return value;
 }
 
-void Init(Host& host, Words& words) {
-    words.Parse({"--scenario"}, {"--force"});
-    words.ExpectPositional(0, "");
-    std::string source = words.Has("--scenario") ? words.Option("--scenario") : "";
-    std::string text = source.empty() ? DefaultScenario() : ReadFile(source);
-    bool existed = host.Exists();
-    try {
-        host.Init(text, words.Has("--force"));
-    } catch (const HostError& error) {
-        if (error.code() == HostError::Code::kScenario)
-            Failure((source.empty() ? "default scenario" : source) + ": " + error.what());
-        if (error.code() == HostError::Code::kExists)
-            Failure(std::string(error.what()) + "; use --force to replace it");
-        throw;
-    }
-    std::cout << (existed ? "Replaced" : "Created") << " the simulated host at '" << host.Dir()
-              << "' from " << (source.empty() ? "the default scenario" : "'" + source + "'")
-              << "\n";
+// An operation name a fault can be set on, else a usage error naming the nearest known ones.
+const std::string& KnownOperation(const std::string& operation) {
+    if (IsKnownOperation(operation)) return operation;
+    Usage(UnknownOperationText(operation));
 }
 
-void FaultCommand(Host& host, const std::string& action, Words& words) {
-    if (action == "add") {
-        words.Parse({"--times"}, {});
-        words.ExpectPositional(2, "an OPERATION and a MESSAGE");
-        std::optional<std::int64_t> times;
-        if (words.Has("--times")) times = ParseTimes(words.Option("--times"));
-        const std::string& operation = words.Positional()[0];
-        if (!IsKnownOperation(operation)) Usage(UnknownOperationText(operation), false);
-        host.AddFault(operation, words.Positional()[1], times);
-    } else if (action == "list") {
-        words.Parse({}, {});
-        words.ExpectPositional(0, "");
-        for (const Fault& fault : host.Faults()) {
-            std::cout << fault.operation << '\t'
-                      << nlohmann::json(fault.message)
-                             .dump(-1, ' ', false, nlohmann::json::error_handler_t::replace)
-                      << '\t'
-                      << (fault.remaining ? std::to_string(*fault.remaining) + " left" : "always")
-                      << '\n';
+// Display width of UTF-8 text: its code points (every text here is left-to-right and narrow).
+std::size_t Width(const std::string& text) {
+    std::size_t width = 0;
+    for (unsigned char c : text) width += (c & 0xC0) != 0x80;
+    return width;
+}
+
+// Rows under a header, each column padded to its widest cell and separated by two spaces; the
+// last column is not padded. Nothing at all when there are no rows.
+void PrintTable(const std::vector<std::string>& header,
+                const std::vector<std::vector<std::string>>& rows) {
+    if (rows.empty()) return;
+    std::vector<std::size_t> widths(header.size());
+    auto measure = [&](const std::vector<std::string>& row) {
+        for (std::size_t i = 0; i < row.size(); ++i) widths[i] = std::max(widths[i], Width(row[i]));
+    };
+    measure(header);
+    for (const auto& row : rows) measure(row);
+    auto print = [&](const std::vector<std::string>& row) {
+        for (std::size_t i = 0; i < row.size(); ++i) {
+            std::cout << row[i];
+            if (i + 1 < row.size()) std::cout << std::string(widths[i] - Width(row[i]) + 2, ' ');
         }
-    } else if (action == "clear") {
-        words.Parse({}, {});
-        words.ExpectPositional(0, "");
-        host.ClearFaults();
-    } else {
-        Usage("unknown fault action '" + action + "' (expected add, list or clear)");
+        std::cout << '\n';
+    };
+    print(header);
+    for (const auto& row : rows) print(row);
+}
+
+std::string JsonText(const nlohmann::json& value) {
+    return value.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace);
+}
+
+// One JSON object per entry and line, its arguments as an object.
+void PrintJsonLines(const std::vector<JournalEntry>& entries) {
+    for (const JournalEntry& entry : entries) {
+        nlohmann::ordered_json line = {{"sequence", entry.sequence},
+                                       {"time", entry.time},
+                                       {"kind", entry.kind},
+                                       {"operation", entry.operation}};
+        auto arguments = nlohmann::ordered_json::parse(entry.arguments, nullptr, false);
+        line["arguments"] = arguments.is_discarded() ? nlohmann::ordered_json(entry.arguments) : arguments;
+        std::cout << line.dump(-1, ' ', false, nlohmann::json::error_handler_t::replace) << '\n';
     }
 }
 
-void JournalCommand(Host& host, Words& words) {
-    words.Parse({}, {"--clear"});
-    words.ExpectPositional(0, "");
-    if (words.Has("--clear")) {
-        host.ClearJournal();
+// The program: its command tree (CLI11), and for each command the action that runs it.
+class Program {
+public:
+    Program();
+    int Run(int argc, char** argv);
+
+private:
+    using Action = std::function<void()>;
+
+    // Registration: every command of quarnhost, in the order of its help. Each Add function
+    // declares one command's options and its action.
+    void Register();
+    void AddInit(CLI::App& parent);
+    void AddExport(CLI::App& parent);
+    void AddFaultAdd(CLI::App& parent);
+    void AddFaultList(CLI::App& parent);
+    void AddFaultClear(CLI::App& parent);
+    void AddJournal(CLI::App& parent);
+
+    Host OpenHost() const;
+    // OpenHost, after verifying the whole database file.
+    Host CheckedHost() const;
+    void Parse(int argc, char** argv);
+    void Execute(int argc, char** argv);
+    const CLI::App& Selected() const;
+    void RefuseLeftovers() const;
+
+    CLI::App app_;
+    std::string state_;
+    std::map<const CLI::App*, Action> actions_;
+};
+
+Program::Program() : app_("Administers a simulated host.", "quarnhost") {
+    app_.set_help_flag("-h,--help", "Show this help and exit");
+    app_.set_version_flag("--version", std::string("quarnhost ") + kVersion, "Show the version and exit");
+    // Leftover words are reported by RefuseLeftovers, in this program's words.
+    app_.allow_extras();
+    app_.option_defaults()->disable_flag_override();
+    app_.add_option("--state,--host-state", state_,
+                    "The host's state directory (default: $QUARN_HOST_STATE, else "
+                    "${XDG_STATE_HOME:-$HOME/.local/state}/quarncli/host)")
+        ->type_name("DIR");
+    Register();
+    // After Register, so that the commands do not inherit it.
+    app_.footer("A missing host is created from the default scenario when a command other than "
+                "init first uses it.\nRun 'quarnhost COMMAND --help' for a command's options.");
+}
+
+void Program::Register() {
+    AddInit(app_);
+    AddExport(app_);
+    CLI::App* fault = app_.add_subcommand("fault", "Set, list and clear faults");
+    AddFaultAdd(*fault);
+    AddFaultList(*fault);
+    AddFaultClear(*fault);
+    AddJournal(app_);
+}
+
+void Program::AddInit(CLI::App& parent) {
+    struct Options {
+        std::string scenario;
+        bool force = false;
+    };
+    auto options = std::make_shared<Options>();
+    CLI::App* command = parent.add_subcommand("init", "Create the host from a scenario");
+    actions_[command] = [this, command, options] {
+        bool from_file = command->count("--scenario") != 0;
+        if (from_file && options->scenario.empty())
+            Usage("--scenario needs a file, or - for standard input");
+        std::string text;
+        try {
+            text = from_file ? ReadScenarioSource(options->scenario) : DefaultScenario();
+        } catch (const InputError& error) {
+            Failure(error.what());
+        }
+        std::string source = from_file ? SourceName(options->scenario) : "the default scenario";
+        Host host = OpenHost();
+        bool existed = host.Exists();
+        try {
+            host.Init(text, options->force);
+        } catch (const HostError& error) {
+            if (error.code() == HostError::Code::kScenario)
+                Failure((from_file ? source : "default scenario") + ": " + error.what());
+            if (error.code() == HostError::Code::kExists)
+                Failure(std::string(error.what()) + "; use --force to replace it");
+            throw;
+        }
+        std::cout << (existed ? "Replaced" : "Created") << " the simulated host at '" << host.Dir()
+                  << "' from " << source << "\n";
+    };
+    command->add_option("--scenario", options->scenario,
+                        "Import this scenario file (- reads standard input; at most " +
+                            std::to_string(kMaxScenarioBytes >> 20) +
+                            " MiB) instead of the default scenario")
+        ->type_name("FILE");
+    command->add_flag("--force", options->force,
+                      "Replace an existing host (its state, faults, journal and files)")
+        ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
+}
+
+void Program::AddExport(CLI::App& parent) {
+    CLI::App* command = parent.add_subcommand("export", "Print the host's state as a scenario");
+    actions_[command] = [this] { std::cout << CheckedHost().Export(); };
+}
+
+void Program::AddFaultAdd(CLI::App& parent) {
+    struct Options {
+        std::string operation, message, times;
+    };
+    auto options = std::make_shared<Options>();
+    CLI::App* command = parent.add_subcommand(
+        "add", "Make an operation fail with a message, always or the next N times");
+    actions_[command] = [this, command, options] {
+        if (options->message.empty() && command->count("MESSAGE") == 0)
+            Usage("fault add needs an OPERATION and a MESSAGE");
+        std::optional<std::int64_t> times;
+        if (command->count("--times"))
+            times = WholeNumber("--times", options->times, 1, kMaxFaultTimes);
+        const std::string& operation = KnownOperation(options->operation);
+        CheckedHost().AddFault(operation, options->message, times);
+    };
+    // Required, but checked by the action: an unknown option is the better message.
+    command->add_option("OPERATION", options->operation, "Fully qualified operation name");
+    command->add_option("MESSAGE", options->message, "The error message the operation raises");
+    command->add_option("--times", options->times, "Fail the next N calls only (1 to 1000000000)")
+        ->type_name("N");
+}
+
+void Program::AddFaultList(CLI::App& parent) {
+    CLI::App* command =
+        parent.add_subcommand("list", "List the faults: operation, message, calls left to fail");
+    actions_[command] = [this] {
+        std::vector<std::vector<std::string>> rows;
+        for (const Fault& fault : CheckedHost().Faults())
+            rows.push_back({fault.operation, JsonText(fault.message),
+                            fault.remaining ? std::to_string(*fault.remaining) + " left" : "always"});
+        PrintTable({"OPERATION", "MESSAGE", "TIMES"}, rows);
+    };
+}
+
+void Program::AddFaultClear(CLI::App& parent) {
+    auto operation = std::make_shared<std::string>();
+    CLI::App* command = parent.add_subcommand("clear", "Remove the fault on OPERATION, or every fault");
+    actions_[command] = [this, operation] {
+        if (!operation->empty()) KnownOperation(*operation);
+        Host host = CheckedHost();
+        if (operation->empty()) return host.ClearFaults();
+        try {
+            host.ClearFault(*operation);
+        } catch (const HostError& error) {
+            if (error.code() == HostError::Code::kDamaged) throw;
+            Failure(error.what());
+        }
+    };
+    command->add_option("OPERATION", *operation, "Clear only this operation's fault");
+}
+
+void Program::AddJournal(CLI::App& parent) {
+    struct Options {
+        bool clear = false, json = false;
+        std::string limit;
+    };
+    auto options = std::make_shared<Options>();
+    CLI::App* command =
+        parent.add_subcommand("journal", "Print the journal of changes and faults, or empty it");
+    actions_[command] = [this, command, options] {
+        bool limited = command->count("--limit") != 0;
+        if (options->clear && (options->json || limited))
+            Usage("--clear takes neither --json nor --limit");
+        std::optional<std::int64_t> limit;
+        if (limited) limit = WholeNumber("--limit", options->limit, 0, kMaxFaultTimes);
+        Host host = CheckedHost();
+        if (options->clear) return host.ClearJournal();
+        std::vector<JournalEntry> entries = host.Journal(limit);
+        if (options->json) return PrintJsonLines(entries);
+        std::vector<std::vector<std::string>> rows;
+        for (const JournalEntry& entry : entries)
+            rows.push_back({std::to_string(entry.sequence), entry.time, entry.kind, entry.operation,
+                            entry.arguments});
+        PrintTable({"SEQUENCE", "TIME", "KIND", "OPERATION", "ARGUMENTS"}, rows);
+    };
+    command->add_option("--limit", options->limit, "Only the last N entries")->type_name("N");
+    command->add_flag("--json", options->json, "One JSON object per entry and line (JSON Lines)")
+        ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
+    command->add_flag("--clear", options->clear, "Empty the journal")
+        ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
+}
+
+Host Program::OpenHost() const {
+    if (app_.count("--state") && state_.empty()) Usage("--state needs a directory");
+    return Host(state_.empty() ? StateDirFromEnvironment() : state_);
+}
+
+Host Program::CheckedHost() const {
+    Host host = OpenHost();
+    host.Check();
+    return host;
+}
+
+// The deepest command selected on the command line (the program itself when none).
+const CLI::App& Program::Selected() const {
+    const CLI::App* app = &app_;
+    while (!app->get_subcommands().empty()) app = app->get_subcommands().front();
+    return *app;
+}
+
+// A command's words without the program's name, e.g. "fault add".
+std::string CommandName(const CLI::App& app) {
+    if (!app.get_parent()) return "";
+    std::string parent = CommandName(*app.get_parent());
+    return parent.empty() ? app.get_name() : parent + " " + app.get_name();
+}
+
+// "a, b or c": the commands below app.
+std::string Choices(const CLI::App& app) {
+    std::vector<const CLI::App*> subs = app.get_subcommands({});
+    std::string text;
+    for (std::size_t i = 0; i < subs.size(); ++i)
+        text += (i == 0 ? "" : i + 1 == subs.size() ? " or " : ", ") + subs[i]->get_name();
+    return text;
+}
+
+// Words no command took: an unknown option, command or argument, or a missing command.
+void Program::RefuseLeftovers() const {
+    for (const CLI::App* app = &app_;; app = app->get_subcommands().front()) {
+        // CLI11 keeps the "--" that ended the options among the leftovers.
+        std::vector<std::string> left = app->remaining();
+        auto end_of_options = std::find(left.begin(), left.end(), "--");
+        bool option = end_of_options != left.begin() && !left.empty() && left.front().size() > 1 &&
+                      left.front()[0] == '-';
+        if (end_of_options != left.end()) left.erase(end_of_options);
+        bool is_group = !app->get_subcommands({}).empty();
+        std::string name = CommandName(*app);
+        std::string where = name.empty() ? "" : " for " + name;
+        if (option) Usage("unknown option '" + left.front() + "'" + where);
+        if (!left.empty() && is_group)
+            Usage("unknown " + (name.empty() ? std::string("command") : name + " action") + " '" +
+                  left.front() + "' (expected " + Choices(*app) + ")");
+        if (!left.empty()) Usage("unexpected argument '" + left.front() + "'" + where);
+        if (!app->get_subcommands().empty()) continue;
+        if (is_group && name.empty()) Usage("missing command (" + Choices(*app) + ")");
+        if (is_group) Usage(name + " needs an action (" + Choices(*app) + ")");
         return;
     }
-    for (const JournalEntry& entry : host.Journal())
-        std::cout << entry.sequence << ' ' << entry.time << ' ' << entry.kind << ' '
-                  << entry.operation << ' ' << entry.arguments << '\n';
 }
 
-int Run(int argc, char** argv) {
-    std::vector<std::string> args(argv + 1, argv + argc);
-    for (const std::string& arg : args) {
-        if (arg == "--") break;
-        if (arg == "--help" || arg == "-h") {
-            std::cout << kUsage;
-            return 0;
-        }
+void Program::Parse(int argc, char** argv) {
+    try {
+        app_.parse(argc, argv);
+    } catch (const CLI::CallForHelp&) {
+        std::cout << app_.help();  // the help of the command selected
+        throw;
+    } catch (const CLI::CallForVersion&) {
+        std::cout << "quarnhost " << kVersion << "\n";
+        throw;
+    } catch (const CLI::ParseError& error) {
+        std::string message = error.what();
+        std::replace(message.begin(), message.end(), '\n', ' ');
+        Usage(message);
     }
-    std::optional<std::string> state;
-    std::size_t i = 0;
-    for (; i < args.size() && args[i].size() > 1 && args[i][0] == '-'; ++i) {
-        if (args[i] == "--state") {
-            if (i + 1 >= args.size()) Usage("option '--state' needs a value");
-            if (state) Usage("option '--state' given twice");
-            state = args[++i];
-        } else if (args[i].rfind("--state=", 0) == 0) {
-            if (state) Usage("option '--state' given twice");
-            state = args[i].substr(8);
-        } else {
-            Usage("unknown option '" + args[i] + "'");
-        }
-    }
-    if (state && state->empty()) Usage("option '--state' needs a directory");
-    if (i >= args.size()) Usage("missing command (init, export, fault or journal)");
-    std::string command = args[i++];
-    std::string action;
-    if (command == "fault") {
-        if (i >= args.size()) Usage("fault needs an action (add, list or clear)");
-        action = args[i++];
-    } else if (command != "init" && command != "export" && command != "journal") {
-        Usage("unknown command '" + command + "' (expected init, export, fault or journal)");
-    }
-    Words words(std::vector<std::string>(args.begin() + static_cast<std::ptrdiff_t>(i), args.end()),
-                action.empty() ? command : command + " " + action);
+    RefuseLeftovers();
+}
 
-    Host host(state ? *state : StateDirFromEnvironment());
-    if (command == "init") {
-        Init(host, words);
-    } else if (command == "export") {
-        words.Parse({}, {});
-        words.ExpectPositional(0, "");
-        std::cout << host.Export();
-    } else if (command == "fault") {
-        FaultCommand(host, action, words);
-    } else {
-        JournalCommand(host, words);
+void Program::Execute(int argc, char** argv) {
+    try {
+        Parse(argc, argv);
+        actions_.at(&Selected())();
+    } catch (const CLI::Success&) {
+        // --help or --version, printed
     }
     std::cout.flush();
-    if (!std::cout) Failure("cannot write the output");
-    return 0;
+    if (!std::cout) Failure(std::string("cannot write the output: ") + std::strerror(errno));
+}
+
+int Program::Run(int argc, char** argv) {
+    try {
+        Execute(argc, argv);
+        return 0;
+    } catch (const Refusal& refusal) {
+        std::string help = CommandName(Selected());
+        std::cerr << "quarnhost: " << refusal.message;
+        if (refusal.status == 2)
+            std::cerr << " (see 'quarnhost " << (help.empty() ? "" : help + " ") << "--help')";
+        std::cerr << "\n";
+        return refusal.status;
+    } catch (const std::exception& error) {
+        std::cerr << "quarnhost: " << error.what() << "\n";
+        return 1;
+    }
 }
 
 }  // namespace
 
 int QuarnhostMain(int argc, char** argv) {
     try {
-        return Run(argc, argv);
-    } catch (const Refusal& refusal) {
-        std::cerr << "quarnhost: " << refusal.message << "\n";
-        return refusal.status;
-    } catch (const HostError& error) {
-        std::cerr << "quarnhost: " << error.what() << "\n";
-        return 1;
+        return Program().Run(argc, argv);
     } catch (const std::exception& error) {
         std::cerr << "quarnhost: " << error.what() << "\n";
         return 1;

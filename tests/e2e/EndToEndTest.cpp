@@ -43,9 +43,15 @@ protected:
 };
 
 TEST_F(EndToEnd, VersionOfTheDefaultHostInTemplateOrder) {
+    // The first use creates the host and says where, once.
+    const Result first = Json({"system", "version", "get"});
+    ASSERT_EQ(first.status, 0) << first.err;
+    EXPECT_EQ(first.err,
+              "quarncli: created a new simulated host at '" + state_ + "' from the default scenario\n");
     const Result r = Json({"system", "version", "get"});
     ASSERT_EQ(r.status, 0) << r.err;
     EXPECT_EQ(r.err, "");
+    EXPECT_EQ(r.out, first.out);
     const ordered_json identity = Identity();
     const ordered_json expected = {{"Product", identity["product"]},
                                    {"Version", identity["version"]},
@@ -140,6 +146,21 @@ TEST_F(EndToEnd, UnusableStateDirectoryIsOneClearError) {
     EXPECT_EQ(std::count(r.err.begin(), r.err.end(), '\n'), 1) << r.err;
     // The broken file is left as it was.
     EXPECT_EQ(ReadFile(state_ + "/host.db"), "this is not a host database, nor any database at all.");
+}
+
+TEST_F(EndToEnd, ADamagedHostDatabaseIsNamedInOneLine) {
+    ASSERT_EQ(Host({"init"}).status, 0);
+    // Every page but the first (the schema) overwritten; a new host's database has no WAL yet.
+    std::string db = ReadFile(state_ + "/host.db");
+    ASSERT_GT(db.size(), 4096u);
+    WriteFile(state_ + "/host.db", db.substr(0, 4096) + std::string(db.size() - 4096, '\xa5'));
+    for (const Result& r : {Json({"system", "version", "get"}), Host({"export"})}) {
+        EXPECT_EQ(r.status, 1);
+        EXPECT_EQ(r.out, "");
+        EXPECT_NE(r.err.find("'" + state_ + "/host.db' is damaged"), std::string::npos) << r.err;
+        EXPECT_EQ(r.err.find("SELECT"), std::string::npos) << r.err;
+        EXPECT_EQ(std::count(r.err.begin(), r.err.end(), '\n'), 1) << r.err;
+    }
 }
 
 TEST_F(EndToEnd, SchemaDescribesTheTree) {

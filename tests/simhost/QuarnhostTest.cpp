@@ -1,15 +1,22 @@
-// quarnhost as a process: every command, and every refusal as one line with its exit status.
+// quarnhost as a process: every command, its help, and every refusal as one line with its exit
+// status.
 #include "TestSupport.h"
 
 #include <norlithctl/QuillUserLib.h>
 
+#include <simhost/Db.h>
 #include <simhost/Host.h>
 #include <simhost/Store.h>
 
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <filesystem>
+#include <fstream>
 #include <regex>
+#include <sstream>
 
 namespace {
 
@@ -18,16 +25,33 @@ using simtest::RunQuarnhost;
 
 const std::string kGetUuid = "NorlithCtl::System::SystemInfoImpl::GetSystemUuid";
 
+std::vector<std::string> Lines(const std::string& text) {
+    std::vector<std::string> lines;
+    std::istringstream in(text);
+    for (std::string line; std::getline(in, line);) lines.push_back(line);
+    return lines;
+}
+
 class QuarnhostTest : public ::testing::Test {
 protected:
     ProcessResult Run(std::vector<std::string> args) {
         args.insert(args.begin(), {"--state", state_});
         return RunQuarnhost(args);
     }
+    // Runs a command that must succeed without a word on standard error; returns its output.
+    std::string Ok(const std::vector<std::string>& args) {
+        ProcessResult result = Run(args);
+        EXPECT_EQ(result.status, 0) << ::testing::PrintToString(args) << result.err;
+        EXPECT_EQ(result.err, "") << ::testing::PrintToString(args);
+        return result.out;
+    }
     // A refusal: the status, nothing on stdout, one line on stderr that contains `text`.
     void ExpectRefusal(const std::vector<std::string>& args, int status, const std::string& text) {
-        ProcessResult result = Run(args);
-        SCOPED_TRACE(::testing::PrintToString(args));
+        ExpectOneLine(Run(args), status, text, ::testing::PrintToString(args));
+    }
+    static void ExpectOneLine(const ProcessResult& result, int status, const std::string& text,
+                              const std::string& trace = "") {
+        SCOPED_TRACE(trace);
         EXPECT_EQ(result.status, status);
         EXPECT_EQ(result.out, "");
         ASSERT_FALSE(result.err.empty());
@@ -35,10 +59,9 @@ protected:
         EXPECT_EQ(result.err.find('\n'), result.err.size() - 1) << result.err;
         EXPECT_NE(result.err.find(text), std::string::npos) << result.err;
     }
-    std::string Export() {
-        ProcessResult result = Run({"export"});
-        EXPECT_EQ(result.status, 0) << result.err;
-        return result.out;
+    std::string Export() { return Ok({"export"}); }
+    void Init(const std::string& scenario = "default.json") {
+        Ok({"init", "--scenario", simtest::ScenarioFile(scenario)});
     }
     void TearDown() override { simhost::CloseHost(); }
 
@@ -46,119 +69,236 @@ protected:
     std::string state_ = dir_ / "host";
 };
 
-TEST_F(QuarnhostTest, HelpDescribesEveryCommand) {
-    ProcessResult result = RunQuarnhost({"--help"});
-    EXPECT_EQ(result.status, 0);
-    for (const char* word : {"init", "--scenario", "--force", "export", "fault add", "--times",
-                             "fault list", "fault clear", "journal", "--clear", "--state"})
-        EXPECT_NE(result.out.find(word), std::string::npos) << word;
-    EXPECT_EQ(RunQuarnhost({"fault", "-h"}).out, result.out);
+TEST_F(QuarnhostTest, EveryCommandHasItsOwnHelp) {
+    ProcessResult general = RunQuarnhost({"--help"});
+    EXPECT_EQ(general.status, 0);
+    EXPECT_EQ(general.err, "");
+    for (const char* word : {"init", "export", "fault", "journal", "--state", "--host-state",
+                             "--version", "QUARN_HOST_STATE"})
+        EXPECT_NE(general.out.find(word), std::string::npos) << word;
+    const std::map<std::vector<std::string>, std::vector<std::string>> commands = {
+        {{"init"}, {"quarnhost init", "--scenario", "--force", "standard input", "256 MiB"}},
+        {{"export"}, {"quarnhost export"}},
+        {{"fault"}, {"quarnhost fault", "add", "list", "clear"}},
+        {{"fault", "add"}, {"quarnhost fault add", "OPERATION", "MESSAGE", "--times"}},
+        {{"fault", "list"}, {"quarnhost fault list"}},
+        {{"fault", "clear"}, {"quarnhost fault clear", "OPERATION"}},
+        {{"journal"}, {"quarnhost journal", "--clear", "--limit", "--json"}},
+    };
+    for (const auto& [words, expected] : commands) {
+        for (const char* flag : {"--help", "-h"}) {
+            std::vector<std::string> args = words;
+            args.push_back(flag);
+            ProcessResult help = RunQuarnhost(args);
+            SCOPED_TRACE(::testing::PrintToString(args));
+            EXPECT_EQ(help.status, 0);
+            EXPECT_NE(help.out, general.out);
+            for (const std::string& word : expected)
+                EXPECT_NE(help.out.find(word), std::string::npos) << word << "\n" << help.out;
+        }
+    }
+    // Help asked for beside other words still helps and touches no host.
+    EXPECT_EQ(Run({"fault", "add", "x", "--help"}).status, 0);
+    EXPECT_FALSE(std::filesystem::exists(state_));
+
+    ProcessResult version = RunQuarnhost({"--version"});
+    EXPECT_EQ(version.status, 0);
+    EXPECT_TRUE(std::regex_match(version.out, std::regex("quarnhost \\d+\\.\\d+\\.\\d+\n"))) << version.out;
 }
 
 TEST_F(QuarnhostTest, InitCreatesRefusesAndReplaces) {
     ProcessResult created = Run({"init", "--scenario", simtest::ScenarioFile("no-netboot.json")});
     EXPECT_EQ(created.status, 0) << created.err;
-    EXPECT_NE(created.out.find("Created"), std::string::npos);
+    EXPECT_EQ(created.out, "Created the simulated host at '" + state_ + "' from '" +
+                               simtest::ScenarioFile("no-netboot.json") + "'\n");
+    EXPECT_EQ(created.err, "");  // init reports on standard output, not as a first use
     EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json"))));
 
     ExpectRefusal({"init"}, 1, "already exists at '" + state_ + "'; use --force");
     EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json"))));
 
-    ProcessResult replaced = Run({"init", "--force"});
-    EXPECT_EQ(replaced.status, 0) << replaced.err;
-    EXPECT_NE(replaced.out.find("Replaced"), std::string::npos);
+    EXPECT_EQ(Ok({"init", "--force"}),
+              "Replaced the simulated host at '" + state_ + "' from the default scenario\n");
     EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
+
+    // Standard input, here a file and a pipe.
+    ProcessResult piped = simtest::RunQuarnhostWithInput(
+        {"--host-state", state_, "init", "--force", "--scenario", "-"},
+        simtest::ScenarioFile("stateless.json"));
+    EXPECT_EQ(piped.status, 0) << piped.err;
+    EXPECT_EQ(piped.out, "Replaced the simulated host at '" + state_ + "' from standard input\n");
+    EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("stateless.json"))));
+    ProcessResult through_pipe = testsupport::RunProgram(
+        "/bin/sh", {"-c", "cat \"$1\" | \"$0\" --state \"$2\" init --force --scenario -", QUARNHOST_PATH,
+                    simtest::ScenarioFile("no-netboot.json"), state_});
+    EXPECT_EQ(through_pipe.status, 0) << through_pipe.err;
+    EXPECT_TRUE(simtest::Holds(Export(), testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json"))));
 }
 
-TEST_F(QuarnhostTest, ABadScenarioFileIsRefusedWithItsLocation) {
-    ASSERT_EQ(Run({"init", "--scenario", simtest::ScenarioFile("stateless.json")}).status, 0);
+TEST_F(QuarnhostTest, ABadScenarioIsRefusedWithItsLocationAndChangesNothing) {
+    Init("stateless.json");
     std::string before = Export();
     std::string bad = dir_ / "bad.json";
     testsupport::WriteFile(bad, simtest::EditedDefault("/identity/product", std::string(40, 'q')));
     ExpectRefusal({"init", "--force", "--scenario", bad}, 1,
-                  bad + ": scenario: identity.product: expected a string of at most 31 bytes");
+                  "'" + bad + "': scenario: identity.product: expected a string of at most 31 bytes");
     testsupport::WriteFile(bad, "{\"format\": 1,");
     ExpectRefusal({"init", "--force", "--scenario", bad}, 1, "scenario: not valid JSON");
-    ExpectRefusal({"init", "--force", "--scenario", dir_ / "missing.json"}, 1, "cannot read");
-    EXPECT_EQ(Export(), before);
+    ExpectOneLine(simtest::RunQuarnhostWithInput({"--state", state_, "init", "--force", "--scenario", "-"}, bad),
+                  1, "standard input: scenario: not valid JSON");
+    ExpectRefusal({"init", "--force", "--scenario", dir_ / "missing.json"}, 1,
+                  "cannot read '" + dir_ / "missing.json" + "': No such file or directory");
+    EXPECT_TRUE(simtest::Holds(Export(), before));
 }
 
-TEST_F(QuarnhostTest, ExportCreatesTheDefaultHostOnFirstUse) {
-    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
+TEST_F(QuarnhostTest, ScenarioSourcesAreRegularFilesOrStandardInputWithinTheLimit) {
+    Init();
+    std::string before = Export();
+    // A FIFO would block and /dev/zero never ends: neither is read.
+    std::string fifo = dir_ / "fifo";
+    ASSERT_EQ(mkfifo(fifo.c_str(), 0600), 0);
+    ExpectRefusal({"init", "--force", "--scenario", fifo}, 1, "'" + fifo + "' is not a regular file");
+    ExpectRefusal({"init", "--force", "--scenario", "/dev/zero"}, 1, "'/dev/zero' is not a regular file");
+    ExpectRefusal({"init", "--force", "--scenario", dir_.Path()}, 1, "is not a regular file");
+    // One byte over 256 MiB, as a sparse file: refused from its size, and from standard input
+    // once that much was read.
+    std::string big = dir_ / "big.json";
+    std::filesystem::resize_file((testsupport::WriteFile(big, ""), big), (std::uintmax_t{256} << 20) + 1);
+    ExpectRefusal({"init", "--force", "--scenario", big}, 1,
+                  "'" + big + "' is larger than the 256 MiB a scenario may have");
+    ExpectOneLine(simtest::RunQuarnhostWithInput({"--state", state_, "init", "--force", "--scenario", "-"}, big),
+                  1, "standard input is larger than the 256 MiB a scenario may have");
+    // An empty value is no scenario at all, not the default one.
+    ExpectRefusal({"init", "--force", "--scenario="}, 2, "--scenario");
+    ExpectRefusal({"init", "--force", "--scenario", ""}, 2,
+                  "--scenario needs a file, or - for standard input");
+    EXPECT_TRUE(simtest::Holds(Export(), before));
+}
+
+TEST_F(QuarnhostTest, FirstUseCreatesTheDefaultHostAndSaysWhere) {
+    ProcessResult first = Run({"export"});
+    EXPECT_EQ(first.status, 0);
+    EXPECT_TRUE(simtest::Holds(first.out, simhost::DefaultScenario()));
+    EXPECT_EQ(first.err,
+              "quarnhost: created a new simulated host at '" + state_ + "' from the default scenario\n");
     EXPECT_TRUE(std::filesystem::is_directory(state_ + "/root"));
+    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));  // said once only
 }
 
 TEST_F(QuarnhostTest, FaultsAreAddedListedAndCleared) {
-    EXPECT_EQ(Run({"fault", "add", kGetUuid, "UUID unavailable", "--times", "3"}).status, 0);
-    EXPECT_EQ(Run({"fault", "add", "--times=2", "QuillUserLib_Init", "two\tparts"}).status, 0);
-    ExpectRefusal({"fault", "add", "NorlithCtl::Util::Sysinfo::Get", "-x"}, 2, "unknown option '-x'");
-    EXPECT_EQ(Run({"fault", "add", "--", "NorlithCtl::Util::Sysinfo::Get", "-- always"}).status, 0);
-    ProcessResult listed = Run({"fault", "list"});
-    EXPECT_EQ(listed.status, 0);
-    EXPECT_EQ(listed.out,
-              kGetUuid + "\t\"UUID unavailable\"\t3 left\n"
-              "NorlithCtl::Util::Sysinfo::Get\t\"-- always\"\talways\n"
-              "QuillUserLib_Init\t\"two\\tparts\"\t2 left\n");
+    Init();
+    Ok({"fault", "add", kGetUuid, "UUID unavailable", "--times", "3"});
+    Ok({"fault", "add", "--times=2", "QuillUserLib_Init", "two\tparts"});
+    ExpectRefusal({"fault", "add", "NorlithCtl::Util::Sysinfo::Get", "-x"}, 2,
+                  "unknown option '-x' for fault add");
+    Ok({"fault", "add", "--", "NorlithCtl::Util::Sysinfo::Get", "-- always"});
+    Ok({"fault", "add", "QuillUserLib_Close", "é"});
+    EXPECT_EQ(Ok({"fault", "list"}),
+              "OPERATION                                          MESSAGE             TIMES\n"
+              "NorlithCtl::System::SystemInfoImpl::GetSystemUuid  \"UUID unavailable\"  3 left\n"
+              "NorlithCtl::Util::Sysinfo::Get                     \"-- always\"         always\n"
+              "QuillUserLib_Close                                 \"é\"                 always\n"
+              "QuillUserLib_Init                                  \"two\\tparts\"        2 left\n");
     auto faults = simhost::Host(state_).Faults();
-    ASSERT_EQ(faults.size(), 3u);
-    EXPECT_EQ(faults[2].message, "two\tparts");
+    ASSERT_EQ(faults.size(), 4u);
+    EXPECT_EQ(faults[3].message, "two\tparts");
     simhost::CloseHost();
 
-    EXPECT_EQ(Run({"fault", "clear"}).status, 0);
-    EXPECT_EQ(Run({"fault", "list"}).out, "");
+    // One fault by name; a name without a fault, or no operation at all, is refused.
+    Ok({"fault", "clear", "QuillUserLib_Init"});
+    ExpectRefusal({"fault", "clear", "QuillUserLib_Init"}, 1, "no fault is set on 'QuillUserLib_Init'");
+    ExpectRefusal({"fault", "clear", "GetSystemUUID"}, 2,
+                  "unknown operation 'GetSystemUUID' (nearest: " + kGetUuid);
+    EXPECT_EQ(Lines(Ok({"fault", "list"})).size(), 4u);
+    Ok({"fault", "clear"});
+    EXPECT_EQ(Ok({"fault", "list"}), "");
 }
 
-TEST_F(QuarnhostTest, JournalPrintsOneLinePerEntryAndClears) {
-    Run({"init"});
-    Run({"fault", "add", "QuillUserLib_AddQuill", "full", "--times", "1"});
+TEST_F(QuarnhostTest, JournalPrintsAlignedRowsJsonLinesAndClears) {
+    Init();
+    Ok({"fault", "add", "QuillUserLib_AddQuill", "full", "--times", "1"});
     {
         testsupport::EnvOverride env("QUARN_HOST_STATE", state_);
         ASSERT_EQ(QuillUserLib_Init(), 0);
         EXPECT_EQ(QuillUserLib_AddQuill("first"), -1);
-        EXPECT_EQ(QuillUserLib_AddQuill("second one"), 0);
+        for (int i = 0; i < 10; ++i) EXPECT_EQ(QuillUserLib_AddQuill("entry %d", i), 0);
         QuillUserLib_Close();
         simhost::CloseHost();
     }
-    ProcessResult journal = Run({"journal"});
-    EXPECT_EQ(journal.status, 0);
-    std::regex line(R"(\d+ \d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}Z (change|fault) \S+ \{.*\})");
-    std::vector<std::string> lines;
-    std::istringstream in(journal.out);
-    for (std::string text; std::getline(in, text);) {
-        EXPECT_TRUE(std::regex_match(text, line)) << text;
-        lines.push_back(text);
+    std::vector<std::string> lines = Lines(Ok({"journal"}));
+    ASSERT_EQ(lines.size(), 12u);
+    EXPECT_EQ(lines[0], "SEQUENCE  TIME                      KIND    OPERATION              ARGUMENTS");
+    std::regex row(R"((\d+) +\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}Z  (change|fault ) +QuillUserLib_AddQuill  \{.*\})");
+    for (std::size_t i = 1; i < lines.size(); ++i) {
+        EXPECT_TRUE(std::regex_match(lines[i], row)) << lines[i];
+        EXPECT_EQ(lines[i].find("20"), lines[0].find("TIME")) << lines[i];  // aligned under TIME
     }
-    ASSERT_EQ(lines.size(), 2u);
-    EXPECT_NE(lines[0].find(" fault QuillUserLib_AddQuill {\"message\":\"first\"}"), std::string::npos);
-    EXPECT_NE(lines[1].find(" change QuillUserLib_AddQuill {\"message\":\"second one\"}"),
+    EXPECT_NE(lines[1].find(" fault   QuillUserLib_AddQuill  {\"message\":\"first\"}"), std::string::npos);
+    EXPECT_NE(lines[11].find(" change  QuillUserLib_AddQuill  {\"message\":\"entry 9\"}"),
               std::string::npos);
 
-    EXPECT_EQ(Run({"journal", "--clear"}).status, 0);
-    EXPECT_EQ(Run({"journal"}).out, "");
+    std::vector<std::string> last = Lines(Ok({"journal", "--limit", "2"}));
+    ASSERT_EQ(last.size(), 3u);
+    EXPECT_EQ(last[2].substr(last[2].find("QuillUserLib")), lines[11].substr(lines[11].find("QuillUserLib")));
+    EXPECT_EQ(Ok({"journal", "--limit=0"}), "");
+    std::vector<std::string> json = Lines(Ok({"journal", "--json", "--limit", "3"}));
+    ASSERT_EQ(json.size(), 3u);
+    std::int64_t previous = 0;
+    for (const std::string& line : json) {
+        auto entry = nlohmann::json::parse(line);
+        EXPECT_GT(entry["sequence"].get<std::int64_t>(), previous);
+        previous = entry["sequence"];
+        EXPECT_EQ(entry["kind"], "change");
+        EXPECT_EQ(entry["operation"], "QuillUserLib_AddQuill");
+    }
+    EXPECT_EQ(nlohmann::json::parse(json[2])["arguments"], nlohmann::json({{"message", "entry 9"}}));
+    EXPECT_EQ(Lines(Ok({"journal", "--json"})).size(), 11u);
+
+    ExpectRefusal({"journal", "--limit", "-1"}, 2, "--limit expects a whole number");
+    ExpectRefusal({"journal", "--clear", "--json"}, 2, "--clear takes neither --json nor --limit");
+    Ok({"journal", "--clear"});
+    EXPECT_EQ(Ok({"journal"}), "");
+    EXPECT_EQ(Ok({"journal", "--json"}), "");
 }
 
-TEST_F(QuarnhostTest, UsageErrorsExitWithTwo) {
-    ExpectRefusal({}, 2, "missing command");
+TEST_F(QuarnhostTest, UsageErrorsExitWithTwoNamingTheProblem) {
+    ExpectRefusal({}, 2, "missing command (init, export, fault or journal)");
     ExpectRefusal({"reboot"}, 2, "unknown command 'reboot'");
     ExpectRefusal({"--verbose", "export"}, 2, "unknown option '--verbose'");
-    ExpectRefusal({"export", "--all"}, 2, "unknown option '--all' for export");
-    ExpectRefusal({"export", "now"}, 2, "unexpected argument 'now'");
-    ExpectRefusal({"init", "--scenario"}, 2, "option '--scenario' needs a value");
-    ExpectRefusal({"init", "--force=yes"}, 2, "takes no value");
-    ExpectRefusal({"journal", "--clear", "--clear"}, 2, "given twice");
-    ExpectRefusal({"fault"}, 2, "fault needs an action");
+    ExpectRefusal({"export", "--all"}, 2, "unknown option '--all' for export (see 'quarnhost export --help')");
+    ExpectRefusal({"export", "now"}, 2, "unexpected argument 'now' for export");
+    ExpectRefusal({"init", "--scenario"}, 2, "--scenario");
+    ExpectRefusal({"init", "--force=yes"}, 2, "force");
+    ExpectRefusal({"journal", "--clear", "--clear"}, 2, "--clear");
+    ExpectRefusal({"fault"}, 2, "fault needs an action (add, list or clear)");
     ExpectRefusal({"fault", "remove"}, 2, "unknown fault action 'remove'");
-    ExpectRefusal({"fault", "add", kGetUuid}, 2, "needs an OPERATION and a MESSAGE");
-    ExpectRefusal({"fault", "add", kGetUuid, "m", "--times"}, 2, "'--times' needs a value");
+    ExpectRefusal({"fault", "add", kGetUuid}, 2,
+                  "fault add needs an OPERATION and a MESSAGE (see 'quarnhost fault add --help')");
+    ExpectRefusal({"fault", "add", kGetUuid, "m", "extra"}, 2, "unexpected argument 'extra' for fault add");
+    ExpectRefusal({"fault", "add", kGetUuid, "m", "--times"}, 2, "--times");
     for (const char* times : {"0", "-1", "abc", "1e3", "2.5", "1000000001", "99999999999999999999"})
         ExpectRefusal({"fault", "add", kGetUuid, "m", "--times", times}, 2, "--times expects");
     ExpectRefusal({"fault", "add", "SystemInfoImpl::GetSystemUUID", "m"}, 2,
                   "unknown operation 'SystemInfoImpl::GetSystemUUID' (nearest: " + kGetUuid);
-    ProcessResult no_state = RunQuarnhost({"--state"});
-    EXPECT_EQ(no_state.status, 2);
-    EXPECT_NE(no_state.err.find("'--state' needs a value"), std::string::npos);
+    ExpectOneLine(RunQuarnhost({"--state"}), 2, "--state");
+    ExpectOneLine(RunQuarnhost({"--state", "", "export"}), 2, "--state needs a directory");
     // None of these created or changed a host.
     EXPECT_FALSE(std::filesystem::exists(state_));
+}
+
+TEST_F(QuarnhostTest, OutputThatCannotBeWrittenIsAFailure) {
+    Init();
+    Ok({"fault", "add", kGetUuid, "m"});
+    for (const std::vector<std::string>& args : std::vector<std::vector<std::string>>{
+             {"--help"}, {"fault", "add", "--help"}, {"--version"}, {"export"}, {"fault", "list"},
+             {"init", "--force"}}) {
+        std::vector<std::string> with_state = {"--state", state_};
+        with_state.insert(with_state.end(), args.begin(), args.end());
+        ProcessResult result = testsupport::RunProgram(QUARNHOST_PATH, with_state, {}, "/dev/full");
+        SCOPED_TRACE(::testing::PrintToString(args));
+        EXPECT_EQ(result.status, 1);
+        EXPECT_EQ(result.err, "quarnhost: cannot write the output: No space left on device\n");
+    }
 }
 
 TEST_F(QuarnhostTest, UnusableStateIsAFailureThatChangesNothing) {
@@ -172,9 +312,56 @@ TEST_F(QuarnhostTest, UnusableStateIsAFailureThatChangesNothing) {
     testsupport::WriteFile(state_ + "/host.db", std::string(4096, 'z'));
     for (auto args : std::vector<std::vector<std::string>>{
              {"export"}, {"journal"}, {"fault", "list"}, {"fault", "add", kGetUuid, "m"},
-             {"init", "--force"}})
-        ExpectRefusal(args, 1, "Cannot open the simulated host at '" + state_ + "'");
+             {"fault", "clear"}, {"init", "--force"}})
+        ExpectRefusal(args, 1, "Cannot open the simulated host at '" + state_ + "': '" + state_ +
+                                   "/host.db': file is not a database");
     EXPECT_EQ(testsupport::ReadFile(state_ + "/host.db"), std::string(4096, 'z'));
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(state_), {}), 2);  // host.lock
+}
+
+// Overwrites the page that holds table's rows with garbage, leaving every other page sound.
+void SmashTable(const std::string& state, const std::string& table) {
+    std::int64_t page = 0, page_size = 0;
+    {
+        simhost::Db db(simhost::DatabasePath(state), simhost::Db::Mode::ReadWrite);
+        db.Exec("PRAGMA wal_checkpoint(TRUNCATE)");
+        page_size = db.QueryInt("PRAGMA page_size");
+        simhost::Query root = db.Cached("SELECT rootpage FROM sqlite_master WHERE name = ?1");
+        root->Bind(1, table);
+        ASSERT_TRUE(root->Step());
+        page = root->Int(0);
+    }
+    std::fstream file(simhost::DatabasePath(state), std::ios::in | std::ios::out | std::ios::binary);
+    file.seekp((page - 1) * page_size);
+    file << std::string(static_cast<std::size_t>(page_size), '\xa5');
+}
+
+TEST_F(QuarnhostTest, ADamagedDatabaseIsOneClearLineUntilReplaced) {
+    Init();
+    Ok({"fault", "add", kGetUuid, "m"});
+    SmashTable(state_, "items");
+    std::string smashed = testsupport::ReadFile(state_ + "/host.db");
+    // Even commands that never read the smashed page refuse the file.
+    for (auto args : std::vector<std::vector<std::string>>{
+             {"export"}, {"journal"}, {"fault", "list"}, {"fault", "add", kGetUuid, "m"},
+             {"fault", "clear"}}) {
+        ProcessResult result = Run(args);
+        ExpectOneLine(result, 1, "'" + state_ + "/host.db' is damaged", ::testing::PrintToString(args));
+        for (const char* sql : {"SELECT", "INSERT", "DELETE", "PRAGMA"})
+            EXPECT_EQ(result.err.find(sql), std::string::npos) << result.err;
+    }
+    EXPECT_EQ(testsupport::ReadFile(state_ + "/host.db"), smashed);
+    ExpectRefusal({"init"}, 1, "already exists");
+    EXPECT_EQ(Ok({"init", "--force"}),
+              "Replaced the simulated host at '" + state_ + "' from the default scenario\n");
+    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
+
+    // Cut short in the middle of its pages.
+    std::filesystem::resize_file(state_ + "/host.db", 3 * 4096 + 100);
+    ProcessResult truncated = Run({"fault", "list"});
+    ExpectOneLine(truncated, 1, "'" + state_ + "/host.db' is damaged");
+    Ok({"init", "--force"});
+    EXPECT_TRUE(simtest::Holds(Export(), simhost::DefaultScenario()));
 }
 
 TEST_F(QuarnhostTest, FindsItsHostLikeQuarncli) {
@@ -191,11 +378,14 @@ TEST_F(QuarnhostTest, FindsItsHostLikeQuarncli) {
         {"journal"}, {{"QUARN_HOST_STATE", std::nullopt}, {"XDG_STATE_HOME", home / "xdg"}});
     EXPECT_EQ(from_xdg.status, 0) << from_xdg.err;
     EXPECT_TRUE(simhost::Host(home / "xdg/quarncli/host").Exists());
+    auto from_option = RunQuarnhost({"--host-state", dir_ / "other", "export"},
+                                    {{"QUARN_HOST_STATE", state_}});
+    EXPECT_EQ(from_option.status, 0) << from_option.err;
+    EXPECT_TRUE(simhost::Host(dir_ / "other").Exists());
     auto nowhere = RunQuarnhost(
         {"export"},
         {{"QUARN_HOST_STATE", std::nullopt}, {"XDG_STATE_HOME", std::nullopt}, {"HOME", std::nullopt}});
-    EXPECT_EQ(nowhere.status, 1);
-    EXPECT_NE(nowhere.err.find("Cannot locate the simulated host"), std::string::npos);
+    ExpectOneLine(nowhere, 1, "Cannot locate the simulated host");
 }
 
 }  // namespace

@@ -126,6 +126,7 @@ protected:
 
 TEST_F(StateStoreTest, CollectionsKeepTheirOrderAndReplaceInPlace) {
     simhost::Session session = simhost::Session::OpenCurrent();
+    simhost::WriteTxn txn(session.db());
     simhost::Items<simhost::mounts::Mount> mounts(session.db());
     auto targets = [&] {
         std::vector<std::string> all;

@@ -14,7 +14,10 @@
 #include <csignal>
 #include <filesystem>
 #include <functional>
+#include <stdexcept>
 
+#include <sys/resource.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace {
@@ -36,6 +39,15 @@ std::string ThrownBy(const std::function<void()>& body) {
         return error.what();
     }
     return "(nothing thrown)";
+}
+
+// Every file directly in dir, by name, with its bytes (directories as "<dir>").
+std::map<std::string, std::string> Snapshot(const std::string& dir) {
+    std::map<std::string, std::string> files;
+    for (const auto& entry : std::filesystem::directory_iterator(dir))
+        files[entry.path().filename().string()] =
+            entry.is_regular_file() ? testsupport::ReadFile(entry.path().string()) : "<dir>";
+    return files;
 }
 
 class StoreTest : public ::testing::Test {
@@ -129,14 +141,14 @@ TEST_F(StoreTest, CorruptOrForeignDatabasesAreRefusedAndLeftAlone) {
 
     std::filesystem::create_directories(dir / "foreign");
     {
-        simhost::Db foreign(dir / "foreign/host.db", true);
+        simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::Create);
         foreign.Exec("CREATE TABLE accounts(name TEXT); INSERT INTO accounts VALUES ('x');");
     }
     message = ThrownBy([&] { UuidOf(dir / "foreign"); });
     EXPECT_NE(message.find("is not a simulated host database"), std::string::npos) << message;
     EXPECT_THROW(simhost::Host(dir / "foreign").Init(simhost::DefaultScenario(), true),
                  simhost::HostError);
-    simhost::Db foreign(dir / "foreign/host.db");
+    simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::ReadOnly);
     EXPECT_EQ(foreign.QueryInt("SELECT count(*) FROM accounts"), 1);
 }
 
@@ -145,7 +157,7 @@ TEST_F(StoreTest, OtherSchemaVersionIsRefusedUntilReplaced) {
     simhost::Host host(dir / "h");
     host.Init();
     {
-        simhost::Db db(simhost::DatabasePath(host.Dir()));
+        simhost::Db db(simhost::DatabasePath(host.Dir()), simhost::Db::Mode::ReadWrite);
         db.Exec("PRAGMA user_version=7; DROP TABLE items;");
     }
     std::string message = ThrownBy([&] { UuidOf(host.Dir()); });
@@ -161,7 +173,7 @@ TEST_F(StoreTest, AProcessKilledInsideAWriteLeavesTheLastCommittedState) {
     std::string path = simhost::DatabasePath(host.Dir());
     int pid = testsupport::ForkChild(
         [](void* context) {
-            simhost::Db db(*static_cast<std::string*>(context));
+            simhost::Db db(*static_cast<std::string*>(context), simhost::Db::Mode::ReadWrite);
             db.Exec("BEGIN IMMEDIATE; DELETE FROM state WHERE domain = 'identity';"
                     "INSERT INTO items(domain, key, value) VALUES ('observations', 'x', '{}');");
             raise(SIGKILL);
@@ -209,6 +221,217 @@ TEST_F(StoreTest, TempHostPointsTheEnvironmentAtAFreshHostAndCleansUp) {
     EXPECT_EQ(simhost::StateDirFromEnvironment(), "/nonexistent/elsewhere");
     EXPECT_FALSE(std::filesystem::exists(dir));
     EXPECT_THROW(simhost::TempHost("{}"), simhost::HostError);
+}
+
+TEST_F(StoreTest, ARefusedReplacementLeavesDatabaseAndRootAsTheyWere) {
+    TempDir dir;
+    simhost::Host host(dir / "h");
+    host.Init(testsupport::ReadFile(simtest::ScenarioFile("no-netboot.json")));
+    host.AddFault("QuillUserLib_Init", "down");
+    simhost::CloseHost();
+    // root/ that is not a directory: the replacement used to be committed before root/ failed.
+    std::filesystem::remove(host.Root());
+    testsupport::WriteFile(host.Root(), "not a directory");
+    auto before = Snapshot(host.Dir());
+    std::string message = ThrownBy([&] { host.Init(simhost::DefaultScenario(), true); });
+    EXPECT_EQ(message, "Cannot open the simulated host at '" + host.Dir() + "': '" + host.Root() +
+                           "' is not a directory");
+    EXPECT_EQ(Snapshot(host.Dir()), before);
+    std::filesystem::remove(host.Root());
+    std::filesystem::create_directory(host.Root());
+    EXPECT_EQ(UuidOf(host.Dir()), "4c4c4544-0042-3510-8057-b7c04f4e3232");
+    EXPECT_EQ(host.Faults().size(), 1u);
+}
+
+// Replaces the host in dir by a larger one with no file allowed past 32 KiB: room enough to open
+// the host (its WAL index takes 32 KiB), too little for the new state's WAL frames, so that the
+// commit fails. Returns 0 when the replacement failed so.
+int ReplaceWithLittleRoom(void* context) {
+    const std::string& dir = *static_cast<std::string*>(context);
+    nlohmann::json scenario = nlohmann::json::parse(simhost::DefaultScenario());
+    for (int i = 0; i < 2000; ++i)
+        scenario["observations"].push_back(
+            {{"time", "2024-03-18T09:12:44.000Z"}, {"message", "observation " + std::to_string(i)}});
+    signal(SIGXFSZ, SIG_IGN);  // a write past the limit fails with EFBIG instead of killing us
+    rlimit limit{32768, 32768};
+    if (setrlimit(RLIMIT_FSIZE, &limit) != 0) return 3;
+    try {
+        simhost::Host(dir).Init(scenario.dump(), true);
+    } catch (const simhost::HostError& error) {
+        return std::string(error.what()).find("cannot write") != std::string::npos ? 0 : 2;
+    }
+    return 1;
+}
+
+TEST_F(StoreTest, AReplacementThatCannotBeWrittenLeavesDatabaseAndRootAsTheyWere) {
+    simhost::TempHost host(testsupport::ReadFile(simtest::ScenarioFile("stateless.json")));
+    host.host().AddFault("QuillUserLib_Init", "down");
+    testsupport::WriteFile(host.host().Root() + "/kept", "the previous host's file");
+    std::string before = host.host().Export();
+    simhost::CloseHost();
+    std::string dir = host.Dir();
+    EXPECT_EQ(testsupport::WaitChild(testsupport::ForkChild(ReplaceWithLittleRoom, &dir)), 0);
+    EXPECT_EQ(host.host().Export(), before);
+    EXPECT_EQ(testsupport::ReadFile(host.host().Root() + "/kept"), "the previous host's file");
+    EXPECT_FALSE(std::filesystem::exists(host.Dir() + "/root.new"));
+}
+
+TEST_F(StoreTest, AReplacementSwitchesRootWithTheDatabase) {
+    simhost::TempHost host;
+    testsupport::WriteFile(host.host().Root() + "/old", "x");
+    // A staging directory left by a process killed while replacing.
+    std::filesystem::create_directories(host.Dir() + "/root.new/stale");
+    host.host().Init(testsupport::ReadFile(simtest::ScenarioFile("stateless.json")), true);
+    EXPECT_TRUE(std::filesystem::is_directory(host.host().Root()));
+    EXPECT_TRUE(std::filesystem::is_empty(host.host().Root()));
+    EXPECT_FALSE(std::filesystem::exists(host.Dir() + "/root.new"));
+    EXPECT_TRUE(simtest::Holds(host.host().Export(), testsupport::ReadFile(simtest::ScenarioFile("stateless.json"))));
+}
+
+TEST_F(StoreTest, SymbolicLinksInTheStateDirectoryAreRefused) {
+    TempDir dir;
+    simhost::Host real(dir / "real");
+    real.Init();
+    simhost::CloseHost();
+    auto untouched = Snapshot(real.Dir());
+    auto expect_refused = [&](const std::string& state, const std::string& link) {
+        std::string message = ThrownBy([&] { UuidOf(state); });
+        EXPECT_EQ(message, "Cannot open the simulated host at '" + state + "': '" + link +
+                               "' is a symbolic link");
+        simhost::CloseHost();
+    };
+    std::filesystem::create_directory(dir / "db");
+    std::filesystem::create_symlink(simhost::DatabasePath(real.Dir()), dir / "db/host.db");
+    expect_refused(dir / "db", dir / "db/host.db");
+    EXPECT_THROW(simhost::Host(dir / "db").Init(simhost::DefaultScenario(), true), simhost::HostError);
+
+    std::filesystem::create_directory(dir / "lock");
+    std::filesystem::create_symlink(dir / "elsewhere.lock", dir / "lock/host.lock");
+    EXPECT_EQ(ThrownBy([&] { simhost::Host(dir / "lock").Init(); }),
+              "Cannot open the simulated host at '" + dir / "lock" + "': '" + dir / "lock/host.lock" +
+                  "' is a symbolic link");
+    EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere.lock"));
+
+    std::filesystem::copy(real.Dir(), dir / "root", std::filesystem::copy_options::recursive);
+    std::filesystem::remove(dir / "root/root");
+    std::filesystem::create_directory_symlink(dir / "real/root", dir / "root/root");
+    expect_refused(dir / "root", dir / "root/root");
+
+    std::filesystem::copy(real.Dir(), dir / "wal", std::filesystem::copy_options::recursive);
+    std::filesystem::remove(dir / "wal/host.db-wal");
+    std::filesystem::create_symlink(dir / "elsewhere-wal", dir / "wal/host.db-wal");
+    expect_refused(dir / "wal", dir / "wal/host.db-wal");
+    EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere-wal"));
+    EXPECT_EQ(Snapshot(real.Dir()), untouched);
+
+    // The state directory itself may be reached through a link.
+    std::filesystem::create_directory_symlink(real.Dir(), dir / "alias");
+    EXPECT_EQ(UuidOf(dir / "alias"), "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c");
+}
+
+TEST_F(StoreTest, AStateDirectoryIsCreatedPrivateToItsOwner) {
+    TempDir dir;
+    simhost::Host(dir / "a/b/host").Init();
+    for (const char* path : {"a", "a/b", "a/b/host"}) {
+        struct stat info {};
+        ASSERT_EQ(stat((dir / path).c_str(), &info), 0);
+        EXPECT_EQ(info.st_mode & 07777, 0700u) << path;
+    }
+    // An existing directory keeps its mode.
+    std::filesystem::create_directory(dir / "shared");
+    chmod((dir / "shared").c_str(), 0755);
+    simhost::Host(dir / "shared").Init();
+    struct stat info {};
+    ASSERT_EQ(stat((dir / "shared").c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 07777, 0755u);
+}
+
+TEST_F(StoreTest, AForeignDatabaseIsNeverWrittenNorGivenCompanionFiles) {
+    TempDir dir;
+    std::string wal_state = dir / "wal";
+    std::filesystem::create_directory(wal_state);
+    // A WAL database whose last transaction is still in its WAL: closing a connection to it
+    // would checkpoint that transaction into the file.
+    std::string path = simhost::DatabasePath(wal_state);
+    int pid = testsupport::ForkChild(
+        [](void* context) {
+            simhost::Db db(*static_cast<std::string*>(context), simhost::Db::Mode::Create);
+            db.Exec("PRAGMA journal_mode=WAL; CREATE TABLE accounts(name TEXT);"
+                    "INSERT INTO accounts VALUES ('x');");
+            raise(SIGKILL);
+            return 0;
+        },
+        &path);
+    EXPECT_EQ(testsupport::WaitChild(pid), 128 + SIGKILL);
+    auto before = Snapshot(wal_state);
+    ASSERT_EQ(before.count("host.db-wal"), 1u);
+    EXPECT_NE(ThrownBy([&] { UuidOf(wal_state); }).find("is not a simulated host database"),
+              std::string::npos);
+    EXPECT_THROW(simhost::Host(wal_state).Init(simhost::DefaultScenario(), true), simhost::HostError);
+    before.emplace("host.lock", "");  // taken by init, the only file it adds
+    EXPECT_EQ(Snapshot(wal_state), before);
+
+    // A database in rollback mode gets no journal, WAL or shared-memory file either.
+    std::string plain = dir / "plain";
+    std::filesystem::create_directory(plain);
+    {
+        simhost::Db db(simhost::DatabasePath(plain), simhost::Db::Mode::Create);
+        db.Exec("CREATE TABLE accounts(name TEXT)");
+    }
+    auto plain_before = Snapshot(plain);
+    EXPECT_NE(ThrownBy([&] { UuidOf(plain); }).find("is not a simulated host database"),
+              std::string::npos);
+    EXPECT_EQ(Snapshot(plain), plain_before);
+}
+
+TEST_F(StoreTest, AConnectionIsReadOnlyUntilItsFirstWrite) {
+    simhost::TempHost host;
+    {
+        simhost::Session session = simhost::Session::Open(host.Dir());
+        simhost::Db& db = session.db();
+        EXPECT_TRUE(db.ReadOnly());
+        EXPECT_EQ(db.QueryInt("SELECT count(*) FROM faults"), 0);
+        {
+            // A statement still stepping would be finalised under its user's feet.
+            simhost::Query alive = db.Cached("SELECT operation FROM faults");
+            EXPECT_THROW(simhost::WriteTxn txn(db), std::logic_error);
+        }
+        {
+            simhost::ReadTxn snapshot(db);
+            EXPECT_THROW(simhost::WriteTxn txn(db), std::logic_error);
+        }
+        EXPECT_TRUE(db.ReadOnly());
+        {
+            simhost::WriteTxn txn(db);
+            db.Cached("INSERT INTO faults(operation, message) VALUES ('QuillUserLib_Init', 'x')")->Run();
+            txn.Commit();
+        }
+        EXPECT_FALSE(db.ReadOnly());
+        EXPECT_EQ(db.QueryInt("SELECT count(*) FROM faults"), 1);  // statements prepared anew
+    }
+    // A fault consumed by a call upgrades the process's connection too.
+    simhost::CloseHost();
+    host.host().AddFault("NorlithCtl::System::SystemInfoImpl::GetSystemUuid", "once", 1);
+    simhost::CloseHost();
+    EXPECT_EQ(ThrownBy([&] { UuidOf(host.Dir()); }), "once");
+    EXPECT_EQ(UuidOf(host.Dir()), "6523a1f4-8c1e-4d2b-9f3a-0050569a2b3c");
+    ASSERT_EQ(host.host().Faults().size(), 1u);
+    EXPECT_EQ(host.host().Faults()[0].operation, "QuillUserLib_Init");
+}
+
+TEST_F(StoreTest, FirstUseSaysWhereItCreatedTheHostOnce) {
+    TempDir dir;
+    std::string state = dir / "typo";
+    ::testing::internal::CaptureStderr();
+    UuidOf(state);
+    simhost::CloseHost();
+    UuidOf(state);
+    std::string said = ::testing::internal::GetCapturedStderr();
+    EXPECT_EQ(said, std::string(program_invocation_short_name) + ": created a new simulated host at '" +
+                        state + "' from the default scenario\n");
+    ::testing::internal::CaptureStderr();
+    simhost::Host(dir / "explicit").Init();
+    EXPECT_EQ(::testing::internal::GetCapturedStderr(), "");
 }
 
 }  // namespace

@@ -32,4 +32,11 @@ testsupport::ProcessResult RunQuarnhost(
     return testsupport::RunProgram(QUARNHOST_PATH, args, env);
 }
 
+testsupport::ProcessResult RunQuarnhostWithInput(const std::vector<std::string>& args,
+                                                 const std::string& input) {
+    std::vector<std::string> shell{"-c", "exec \"$0\" \"$@\" < \"$QUARNHOST_INPUT\"", QUARNHOST_PATH};
+    shell.insert(shell.end(), args.begin(), args.end());
+    return testsupport::RunProgram("/bin/sh", shell, {{"QUARNHOST_INPUT", input}});
+}
+
 }  // namespace simtest

@@ -31,4 +31,8 @@ testsupport::ProcessResult RunQuarnhost(
     const std::vector<std::string>& args,
     const std::map<std::string, std::optional<std::string>>& env = {});
 
+// Runs quarnhost with the arguments and standard input read from the file at input.
+testsupport::ProcessResult RunQuarnhostWithInput(const std::vector<std::string>& args,
+                                                 const std::string& input);
+
 }  // namespace simtest
