@@ -90,6 +90,28 @@ void Host::ClearJournal() { WriteHost(dir_, DeleteJournal); }
 
 namespace {
 
+// The last `last` items of a log (all of them without a limit).
+template <class Entry>
+std::vector<Entry> LastEntries(const std::string& dir, std::optional<std::int64_t> last) {
+    Session session = Session::Open(dir);
+    std::vector<Entry> entries = Items<Entry>(session.db()).All();
+    if (last && *last >= 0 && static_cast<std::size_t>(*last) < entries.size())
+        entries.erase(entries.begin(), entries.end() - static_cast<std::ptrdiff_t>(*last));
+    return entries;
+}
+
+}  // namespace
+
+std::vector<syslog::Entry> Host::SystemLog(std::optional<std::int64_t> last) {
+    return LastEntries<syslog::Entry>(dir_, last);
+}
+
+std::vector<observations::Entry> Host::ObservationLog(std::optional<std::int64_t> last) {
+    return LastEntries<observations::Entry>(dir_, last);
+}
+
+namespace {
+
 std::string MakeTempDir() {
     const char* tmp = std::getenv("TMPDIR");
     std::string pattern = std::string(tmp && *tmp ? tmp : "/tmp") + "/simhost-XXXXXX";

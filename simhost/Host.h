@@ -17,6 +17,7 @@
 #include <simhost/Journal.h>
 #include <simhost/Operations.h>
 #include <simhost/Trace.h>
+#include <simhost/domains/Logs.h>
 
 #include <cstdint>
 #include <optional>
@@ -61,6 +62,11 @@ public:
     // The journal, oldest first; with last, only the last `last` entries.
     std::vector<JournalEntry> Journal(std::optional<std::int64_t> last = std::nullopt);
     void ClearJournal();
+
+    // The host's system log and observation log, oldest first; with last, only the last
+    // `last` entries.
+    std::vector<syslog::Entry> SystemLog(std::optional<std::int64_t> last = std::nullopt);
+    std::vector<observations::Entry> ObservationLog(std::optional<std::int64_t> last = std::nullopt);
 
 private:
     std::string dir_;

@@ -1,5 +1,6 @@
 #include <simhost/cli/Quarnhost.h>
 
+#include <simhost/Events.h>
 #include <simhost/Host.h>
 #include <simhost/Store.h>
 #include <simhost/cli/Input.h>
@@ -115,6 +116,8 @@ private:
     void AddFaultList(CLI::App& parent);
     void AddFaultClear(CLI::App& parent);
     void AddJournal(CLI::App& parent);
+    void AddLog(CLI::App& parent, const char* name, const char* description);
+    void AddOperations(CLI::App& parent);
 
     Host OpenHost() const;
     // OpenHost, after verifying the whole database file.
@@ -153,6 +156,9 @@ void Program::Register() {
     AddFaultList(*fault);
     AddFaultClear(*fault);
     AddJournal(app_);
+    AddLog(app_, "syslog", "Print the host's system log");
+    AddLog(app_, "observations", "Print the host's observation log");
+    AddOperations(app_);
 }
 
 void Program::AddInit(CLI::App& parent) {
@@ -205,6 +211,7 @@ void Program::AddExport(CLI::App& parent) {
 void Program::AddFaultAdd(CLI::App& parent) {
     struct Options {
         std::string operation, message, times;
+        Event event;
     };
     auto options = std::make_shared<Options>();
     CLI::App* command = parent.add_subcommand(
@@ -215,14 +222,26 @@ void Program::AddFaultAdd(CLI::App& parent) {
         std::optional<std::int64_t> times;
         if (command->count("--times"))
             times = WholeNumber("--times", options->times, 1, kMaxFaultTimes);
+        if (!options->event.args.empty() && options->event.id.empty())
+            Usage("--arg needs --event");
+        if (!options->event.Empty()) {
+            std::string problem = CheckEvent(options->event);
+            if (!problem.empty()) Usage("--event: " + problem);
+        }
         const std::string& operation = KnownOperation(options->operation);
-        CheckedHost().AddFault(operation, options->message, times);
+        CheckedHost().AddFault(operation, options->message, times, options->event);
     };
     // Required, but checked by the action: an unknown option is the better message.
     command->add_option("OPERATION", options->operation, "Fully qualified operation name");
     command->add_option("MESSAGE", options->message, "The error message the operation raises");
     command->add_option("--times", options->times, "Fail the next N calls only (1 to 1000000000)")
         ->type_name("N");
+    command->add_option("--event", options->event.id,
+                        "Attach this event of the catalog (see 'quarnhost operations') to the error")
+        ->type_name("ID");
+    command->add_option("--arg", options->event.args, "An argument of the event, in order (repeatable)")
+        ->type_name("TEXT")
+        ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
 }
 
 void Program::AddFaultList(CLI::App& parent) {
@@ -232,8 +251,9 @@ void Program::AddFaultList(CLI::App& parent) {
         std::vector<std::vector<std::string>> rows;
         for (const Fault& fault : CheckedHost().Faults())
             rows.push_back({fault.operation, JsonText(fault.message),
-                            fault.remaining ? std::to_string(*fault.remaining) + " left" : "always"});
-        PrintTable({"OPERATION", "MESSAGE", "TIMES"}, rows);
+                            fault.remaining ? std::to_string(*fault.remaining) + " left" : "always",
+                            fault.event.Empty() ? "" : JsonText(FormatEvent(fault.event))});
+        PrintTable({"OPERATION", "MESSAGE", "TIMES", "EVENT"}, rows);
     };
 }
 
@@ -283,6 +303,67 @@ void Program::AddJournal(CLI::App& parent) {
         ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
     command->add_flag("--clear", options->clear, "Empty the journal")
         ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
+}
+
+void Program::AddLog(CLI::App& parent, const char* name, const char* description) {
+    struct Options {
+        bool json = false;
+        std::string limit;
+    };
+    auto options = std::make_shared<Options>();
+    bool system = std::string(name) == "syslog";
+    CLI::App* command = parent.add_subcommand(name, description);
+    actions_[command] = [this, command, options, system] {
+        std::optional<std::int64_t> limit;
+        if (command->count("--limit")) limit = WholeNumber("--limit", options->limit, 0, kMaxFaultTimes);
+        Host host = CheckedHost();
+        std::vector<std::vector<std::string>> rows;
+        if (system) {
+            for (const syslog::Entry& entry : host.SystemLog(limit)) {
+                if (options->json)
+                    std::cout << JsonText(nlohmann::ordered_json{{"time", entry.time},
+                                                                  {"priority", entry.priority},
+                                                                  {"message", entry.message}})
+                              << '\n';
+                else
+                    rows.push_back({entry.time, std::to_string(entry.priority), JsonText(entry.message)});
+            }
+            PrintTable({"TIME", "PRIORITY", "MESSAGE"}, rows);
+        } else {
+            for (const observations::Entry& entry : host.ObservationLog(limit)) {
+                if (options->json)
+                    std::cout << JsonText(nlohmann::ordered_json{{"time", entry.time},
+                                                                  {"message", entry.message}})
+                              << '\n';
+                else
+                    rows.push_back({entry.time, JsonText(entry.message)});
+            }
+            PrintTable({"TIME", "MESSAGE"}, rows);
+        }
+    };
+    command->add_option("--limit", options->limit, "Only the last N entries")->type_name("N");
+    command->add_flag("--json", options->json, "One JSON object per entry and line (JSON Lines)")
+        ->multi_option_policy(CLI::MultiOptionPolicy::Throw);
+}
+
+void Program::AddOperations(CLI::App& parent) {
+    auto markdown = std::make_shared<bool>(false);
+    CLI::App* command = parent.add_subcommand(
+        "operations", "List the host operations faults can be set on, and the event catalog");
+    actions_[command] = [markdown] {
+        if (*markdown) {
+            std::cout << OperationsMarkdown();
+            return;
+        }
+        std::vector<std::vector<std::string>> rows;
+        for (const OperationInfo& info : Operations()) rows.push_back({info.name, info.doc});
+        PrintTable({"OPERATION", "WHAT IT DOES"}, rows);
+        rows.clear();
+        for (const EventInfo& event : EventCatalog()) rows.push_back({event.id, event.text});
+        std::cout << '\n';
+        PrintTable({"EVENT", "TEXT"}, rows);
+    };
+    command->add_flag("--markdown", *markdown, "Print the page docs/operations.md is");
 }
 
 Host Program::OpenHost() const {

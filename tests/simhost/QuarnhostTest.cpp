@@ -2,6 +2,7 @@
 // status.
 #include "TestSupport.h"
 
+#include <norlithctl/Env.h>
 #include <norlithctl/QuillUserLib.h>
 
 #include <simhost/Db.h>
@@ -386,6 +387,36 @@ TEST_F(QuarnhostTest, FindsItsHostLikeQuarncli) {
         {"export"},
         {{"QUARN_HOST_STATE", std::nullopt}, {"XDG_STATE_HOME", std::nullopt}, {"HOME", std::nullopt}});
     ExpectOneLine(nowhere, 1, "Cannot locate the simulated host");
+}
+
+}  // namespace
+
+namespace {
+
+TEST_F(QuarnhostTest, ShowsTheHostsLogsOperationsAndEvents) {
+    Init();
+    EXPECT_EQ(Ok({"observations", "--limit", "1"}),
+              "TIME                      MESSAGE\n"
+              "2024-03-18T09:12:44.000Z  \"Host booted: Quarn 8.0.2 build 22380479\"\n");
+    EXPECT_EQ(Ok({"syslog"}), "");  // an empty log prints nothing
+    {
+        testsupport::EnvOverride env("QUARN_HOST_STATE", state_);
+        NorlithCtl::Os::Env::Default()->Syslog(2, "line one\nline two");
+        simhost::CloseHost();
+    }
+    EXPECT_EQ(nlohmann::json::parse(Ok({"syslog", "--json"}))["message"], "line one\nline two");
+    EXPECT_NE(Ok({"syslog"}).find("\"line one\\nline two\""), std::string::npos);
+
+    std::string operations = Ok({"operations"});
+    for (const simhost::OperationInfo& info : simhost::Operations())
+        EXPECT_NE(operations.find(info.name), std::string::npos) << info.name;
+    EXPECT_EQ(Ok({"operations", "--markdown"}), simhost::OperationsMarkdown());
+
+    Ok({"fault", "add", kGetUuid, "busy", "--event", "quill.host.unavailable", "--arg", "in maintenance"});
+    EXPECT_NE(Ok({"fault", "list"}).find("\"The host is not available: in maintenance\""), std::string::npos);
+    ExpectRefusal({"fault", "add", kGetUuid, "m", "--event", "quill.host.unavailable"}, 2,
+                  "event 'quill.host.unavailable' takes 1 argument, not 0");
+    ExpectRefusal({"fault", "add", kGetUuid, "m", "--arg", "x"}, 2, "--arg needs --event");
 }
 
 }  // namespace
