@@ -248,12 +248,19 @@ void Program::AddFaultList(CLI::App& parent) {
     CLI::App* command =
         parent.add_subcommand("list", "List the faults: operation, message, calls left to fail");
     actions_[command] = [this] {
+        std::vector<Fault> faults = CheckedHost().Faults();
+        // The event column only when a fault carries an event record.
+        bool events = std::any_of(faults.begin(), faults.end(),
+                                  [](const Fault& fault) { return !fault.event.Empty(); });
         std::vector<std::vector<std::string>> rows;
-        for (const Fault& fault : CheckedHost().Faults())
+        for (const Fault& fault : faults) {
             rows.push_back({fault.operation, JsonText(fault.message),
-                            fault.remaining ? std::to_string(*fault.remaining) + " left" : "always",
-                            fault.event.Empty() ? "" : JsonText(FormatEvent(fault.event))});
-        PrintTable({"OPERATION", "MESSAGE", "TIMES", "EVENT"}, rows);
+                            fault.remaining ? std::to_string(*fault.remaining) + " left" : "always"});
+            if (events) rows.back().push_back(fault.event.Empty() ? "" : JsonText(FormatEvent(fault.event)));
+        }
+        std::vector<std::string> header{"OPERATION", "MESSAGE", "TIMES"};
+        if (events) header.push_back("EVENT");
+        PrintTable(header, rows);
     };
 }
 
