@@ -10,8 +10,8 @@
 
 #include <cstddef>
 #include <cstring>
+#include <memory>
 #include <string>
-#include <vector>
 
 namespace Kitbase {
 namespace Engine {
@@ -29,12 +29,12 @@ public:
     Writer& operator=(const Writer&) = delete;
 
     void Put(char c) {
-        if (used_ == buffer_.size()) Drain();
+        if (used_ == capacity_) Drain();
         buffer_[used_++] = c;
     }
     void Put(const char* data, std::size_t size) {
-        if (size <= buffer_.size() - used_) {
-            std::memcpy(&buffer_[used_], data, size);
+        if (size <= capacity_ - used_) {
+            std::memcpy(buffer_.get() + used_, data, size);
             used_ += size;
         } else {
             PutLarge(data, size);
@@ -58,7 +58,10 @@ private:
     Sink sink_;
     int fd_;
     std::string* target_;
-    std::vector<char> buffer_;
+    // Left uninitialised: only the used part is ever read, and zeroing 64 KiB costs a short
+    // process more than its output does.
+    std::unique_ptr<char[]> buffer_;
+    std::size_t capacity_;
     std::size_t used_;
     int error_;
 };

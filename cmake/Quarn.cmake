@@ -1,0 +1,62 @@
+# How the project's programs, libraries and plug-ins are linked.
+#
+# The libraries (quarnutil, kitbase, simhost, norlithctl, norlithuser) are static archives of
+# position-independent code compiled with hidden visibility; what plug-ins call carries default
+# visibility (KITBASE_API, NORLITHCTL_API). A program that loads plug-ins contains the framework
+# and the host-control libraries whole and exports their API (quarn_plugin_host), so a plug-in
+# links none of them: it resolves them, and the C++ runtime, from the program that loads it
+# (quarn_add_plugin). quarncli also carries the C++ runtime inside (quarn_static_runtime): a
+# short-lived process then binds no shared C++ runtime at start-up, which was most of its cost.
+
+# Programs link the C++ runtime statically unless a sanitizer or the fuzzer runtime is in use
+# (their allocators and interceptors expect the shared one).
+if(QUARN_SANITIZE OR QUARN_FUZZ)
+  set(QUARN_STATIC_RUNTIME_DEFAULT OFF)
+else()
+  set(QUARN_STATIC_RUNTIME_DEFAULT ON)
+endif()
+option(QUARN_STATIC_RUNTIME "Link quarncli with the C++ runtime inside, exported to its plug-ins"
+  ${QUARN_STATIC_RUNTIME_DEFAULT})
+
+# target loads plug-ins: it holds kitbase, norlithctl and norlithuser whole and exports every
+# symbol of default visibility (SQLite's stay private).
+function(quarn_plugin_host target)
+  # The archives whole, by path, ahead of everything else on the link line (so the archives'
+  # later appearances, as dependencies, find every member loaded already).
+  target_link_libraries(${target} PRIVATE kitbase norlithctl norlithuser)
+  # (One SHELL: group each, so that CMake's de-duplication of options leaves them whole.)
+  target_link_options(${target} PRIVATE "SHELL:-Wl,--whole-archive $<TARGET_FILE:kitbase> \
+$<TARGET_FILE:norlithctl> $<TARGET_FILE:norlithuser> -Wl,--no-whole-archive")
+  set_target_properties(${target} PROPERTIES ENABLE_EXPORTS ON)
+  target_link_options(${target} PRIVATE "LINKER:--exclude-libs,libsqlite3.a")
+endfunction()
+
+include(CheckLinkerFlag)
+check_linker_flag(CXX "-Wl,-z,pack-relative-relocs" QUARN_LINKER_HAS_RELR)
+
+# target carries the whole C++ runtime, exported, for itself and its plug-ins. Its relative
+# relocations are packed (DT_RELR) where the tools support it: fewer to read at every start.
+function(quarn_static_runtime target)
+  if(QUARN_STATIC_RUNTIME)
+    target_link_options(${target} PRIVATE -static-libstdc++
+      "SHELL:-Wl,--whole-archive -l:libstdc++.a -Wl,--no-whole-archive")
+  endif()
+  if(QUARN_LINKER_HAS_RELR)
+    target_link_options(${target} PRIVATE "LINKER:-z,pack-relative-relocs")
+  endif()
+endfunction()
+
+# A plug-in: a module of hidden visibility that compiles against the framework's and the
+# host-control library's headers and links neither them nor the C++ runtime (the program that
+# loads it provides them).
+function(quarn_add_plugin target)
+  add_library(${target} MODULE ${ARGN})
+  target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/include)
+  # No default libraries (the C++ runtime among them): only the C library and the unwinder.
+  target_link_options(${target} PRIVATE -nodefaultlibs)
+  target_link_libraries(${target} PRIVATE Boost::boost c gcc_s)
+  set_target_properties(${target} PROPERTIES
+    PREFIX "lib"
+    CXX_VISIBILITY_PRESET hidden
+    VISIBILITY_INLINES_HIDDEN ON)
+endfunction()
