@@ -261,6 +261,22 @@ private:
     Problem problem_;
 };
 
+// The structure of a type: its members' names and kinds, never values (for schema versions).
+class ShapeVisitor {
+public:
+    explicit ShapeVisitor(std::string& out) : out_(out) { out_ += '{'; }
+    template <class F, class... R>
+    void operator()(const char* name, F&, const R&...) {
+        out_ += name;
+        out_ += ':';
+        Codec<F>::Shape(out_);
+        out_ += ',';
+    }
+
+private:
+    std::string& out_;
+};
+
 template <class I>
 std::string IntegerExpected() {
     return RangeText(static_cast<std::int64_t>(std::numeric_limits<I>::min()),
@@ -281,6 +297,7 @@ struct Codec<std::string> {
     }
     static nlohmann::ordered_json Write(const std::string& value) { return value; }
     static Problem Check(const std::string& value) { return {"", CheckText(value, SIZE_MAX)}; }
+    static void Shape(std::string& out) { out += 's'; }
 };
 
 template <>
@@ -291,6 +308,7 @@ struct Codec<bool> {
     }
     static nlohmann::ordered_json Write(bool value) { return value; }
     static Problem Check(bool) { return {}; }
+    static void Shape(std::string& out) { out += 'b'; }
 };
 
 template <class I>
@@ -314,6 +332,7 @@ struct Codec<I, std::enable_if_t<std::is_integral<I>::value && !std::is_same<I, 
     }
     static nlohmann::ordered_json Write(I value) { return value; }
     static Problem Check(I) { return {}; }
+    static void Shape(std::string& out) { out += 'i'; }
 };
 
 template <class T>
@@ -339,6 +358,11 @@ struct Codec<std::vector<T>> {
             if (problem) return problem.Under("[" + std::to_string(i) + "]");
         }
         return {};
+    }
+    static void Shape(std::string& out) {
+        out += '[';
+        Codec<T>::Shape(out);
+        out += ']';
     }
 };
 
@@ -368,6 +392,11 @@ struct Codec<std::map<std::string, T>> {
         }
         return {};
     }
+    static void Shape(std::string& out) {
+        out += "{*:";
+        Codec<T>::Shape(out);
+        out += '}';
+    }
 };
 
 template <class T>
@@ -385,6 +414,10 @@ struct Codec<std::optional<T>> {
     }
     static Problem Check(const std::optional<T>& value) {
         return value ? Codec<T>::Check(*value) : Problem{};
+    }
+    static void Shape(std::string& out) {
+        out += '?';
+        Codec<T>::Shape(out);
     }
 };
 
@@ -413,6 +446,12 @@ struct Codec<T, std::enable_if_t<mapping_detail::Described<T>::value>> {
             if (!problem) problem = Problem{"", value.Check()};
         }
         return problem;
+    }
+    static void Shape(std::string& out) {
+        mapping_detail::ShapeVisitor visitor(out);
+        T sample{};
+        Describe(visitor, sample);
+        out += '}';
     }
 };
 

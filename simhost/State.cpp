@@ -108,27 +108,6 @@ std::string Missing(const char* domain) {
 
 }  // namespace state_detail
 
-std::string ShapeOf(const nlohmann::ordered_json& sample) {
-    switch (sample.type()) {
-    case nlohmann::ordered_json::value_t::object: {
-        std::string shape = "{";
-        for (auto it = sample.begin(); it != sample.end(); ++it)
-            shape += it.key() + ":" + ShapeOf(it.value()) + ",";
-        return shape + "}";
-    }
-    case nlohmann::ordered_json::value_t::array:
-        return "[" + (sample.empty() ? std::string() : ShapeOf(sample.front())) + "]";
-    case nlohmann::ordered_json::value_t::string:
-        return "s";
-    case nlohmann::ordered_json::value_t::boolean:
-        return "b";
-    case nlohmann::ordered_json::value_t::null:
-        return "n";
-    default:
-        return "i";
-    }
-}
-
 void BootAllDomains(Db& db) {
     for (const Domain* domain : Domains()) domain->Boot(db);
 }

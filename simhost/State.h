@@ -235,14 +235,16 @@ private:
     std::vector<T> items_;
 };
 
-// The structure of a sample value (member names and value kinds, not values), for Shape().
-SIMHOST_API std::string ShapeOf(const nlohmann::ordered_json& sample);
 
 template <class T>
 class SingletonDomain : public Domain {
 public:
     const char* Name() const override { return T::kSection; }
-    std::string Shape() const override { return ShapeOf(Codec<T>::Write(T{})); }
+    std::string Shape() const override {
+        std::string shape;
+        Codec<T>::Shape(shape);
+        return shape;
+    }
     std::unique_ptr<Section> Parse(const nlohmann::json* value, const Location& at) const override {
         T state = T::Default();
         if (value) Codec<T>::Read(*value, at, state);
@@ -266,7 +268,9 @@ class ListDomain : public Domain {
 public:
     const char* Name() const override { return T::kSection; }
     std::string Shape() const override {
-        return ShapeOf(nlohmann::ordered_json::array({Codec<T>::Write(T{})}));
+        std::string shape;
+        Codec<std::vector<T>>::Shape(shape);
+        return shape;
     }
     std::unique_ptr<Section> Parse(const nlohmann::json* value, const Location& at) const override {
         std::vector<T> items = T::Default();
