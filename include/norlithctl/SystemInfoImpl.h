@@ -29,6 +29,11 @@ public:
     virtual std::string GetStatelessBootNicMacAddress();
 
     // ---- welcome message
+    // The direct console's welcome message, byte for byte ("" when there is none).
+    virtual std::string GetWelcomeMessage();
+    // Replaces it. Refused (nothing changes) when empty, longer than 4096 bytes, not UTF-8, or
+    // holding a control character other than tab, line feed and carriage return.
+    virtual void SetWelcomeMessage(std::string message);
 
     // ---- maintenance mode
 

@@ -9,9 +9,18 @@
 #include "frame/Export.h"
 // identity, time and console
 #include "identity/BootDeviceGet.h"
+#include "identity/HostnameGet.h"
+#include "identity/HostnameSet.h"
 #include "identity/UuidGet.h"
 #include "identity/VersionGet.h"
+#include "identity/WelcomeMessageGet.h"
+#include "identity/WelcomeMessageSet.h"
 // processes and security policy
+#include "process/ProcessList.h"
+#include "process/ProcessStatsLoadGet.h"
+#include "process/ProcessStatsRunningGet.h"
+#include "process/SecpolicyDomainList.h"
+#include "process/SecpolicyDomainSet.h"
 
 // SNMP agent
 
@@ -65,11 +74,18 @@ const TreeRow kTree[] = {
     {"system coredump file", "Operations pertaining to the Norlith Core dump configuration on QRFS Files.", nullptr},
     {"system secpolicy", "Options related to Norlith access control subsystem. These options are typically in place for specific workarounds or debugging. These commands should be used at the direction of Tarsel Support Engineers.", nullptr},
     {"system secpolicy domain", "Options related to Norlith access control security domains.", nullptr},
+    {"system secpolicy domain list", nullptr, &Make<SecpolicyDomainList>},
+    {"system secpolicy domain set", nullptr, &Make<SecpolicyDomainSet>},
     {"system process", "Commands relating to running processes.", nullptr},
+    {"system process list", nullptr, &Make<ProcessList>},
     {"system process stats", "Process related statistics", nullptr},
     {"system process stats load", "System load averages", nullptr},
+    {"system process stats load get", nullptr, &Make<ProcessStatsLoadGet>},
     {"system process stats running", "Number of currently running worlds", nullptr},
+    {"system process stats running get", nullptr, &Make<ProcessStatsRunningGet>},
     {"system welcomemsg", "Commands to get and set the welcome banner for Tolmar.", nullptr},
+    {"system welcomemsg set", nullptr, &Make<WelcomeMessageSet>},
+    {"system welcomemsg get", nullptr, &Make<WelcomeMessageGet>},
     {"system mirafs", "Operations pertaining to the mirafs memory filesytem.", nullptr},
     {"system mirafs ramdisk", "Operations pertaining to mirafs ramdisks.", nullptr},
     {"system mirafs tardisk", "Operations pertaining to mirafs tardisks.", nullptr},
@@ -81,6 +97,8 @@ const TreeRow kTree[] = {
     {"system uuid", "Get the system UUID", nullptr},
     {"system uuid get", nullptr, &Make<UuidGet>},
     {"system hostname", "Operations pertaining the network name of the Quarn host.", nullptr},
+    {"system hostname set", nullptr, &Make<HostnameSet>},
+    {"system hostname get", nullptr, &Make<HostnameGet>},
     {"system snmp", "Commands pertaining to SNMPv1/v2c/v3 Agent configuration.", nullptr},
     {"system shutdown", "Command to shutdown the system.", nullptr},
     {"system maintenanceMode", "Command to manage the system's maintenance mode.", nullptr},
