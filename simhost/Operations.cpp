@@ -77,15 +77,19 @@ std::string OperationsMarkdown() {
         "with `quarnhost fault add NAME MESSAGE`; the journal and the call trace name them so.\n"
         "This page is generated from simhost/Registry.def by `quarnhost operations`; a test keeps it\n"
         "current.\n";
-    std::string current = "\x01";
+    // One section per class, in the order classes first appear; a class's operations together
+    // even when the registry declares them in several places.
+    std::vector<std::string> owners;
     for (const OperationInfo& info : kOperations) {
         std::string owner = ClassOf(info.name);
-        if (owner != current) {
-            current = owner;
-            text += "\n## " + (owner.empty() ? std::string("Event library") : "`" + owner + "`") +
-                    "\n\n| operation | what it does |\n|---|---|\n";
-        }
-        text += std::string("| `") + info.name + "` | " + info.doc + " |\n";
+        if (std::find(owners.begin(), owners.end(), owner) == owners.end()) owners.push_back(owner);
+    }
+    for (const std::string& owner : owners) {
+        text += "\n## " + (owner.empty() ? std::string("Event library") : "`" + owner + "`") +
+                "\n\n| operation | what it does |\n|---|---|\n";
+        for (const OperationInfo& info : kOperations)
+            if (ClassOf(info.name) == owner)
+                text += std::string("| `") + info.name + "` | " + info.doc + " |\n";
     }
     text +=
         "\n# Events\n\n"
