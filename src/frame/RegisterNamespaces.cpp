@@ -2,9 +2,10 @@
 //
 // AutoCli_RegisterNamespaces obtains the node "system" from the framework's root and walks one
 // table, in order: each row is either a namespace with its description or a command leaf made by
-// its class's factory, attached to its parent under the last word of its path. A parent always
-// precedes its children, so children end up attached in table order. When the function returns,
-// the framework owns the tree; nothing here keeps a reference.
+// its class's factory, attached to its parent under the last word of its path. The table lists
+// the tree depth first (a parent before its children, each subtree contiguous), so children end
+// up attached in table order; a row out of that order is a programming error (std::logic_error).
+// When the function returns, the framework owns the tree; nothing here keeps a reference.
 #include "frame/CommandModel.h"
 #include "frame/Export.h"
 // identity, time and console
@@ -35,8 +36,11 @@
 // memory file system
 
 
-#include <map>
+#include <algorithm>
+#include <stdexcept>
 #include <string>
+#include <utility>
+#include <vector>
 
 namespace TarselCli {
 namespace System {
@@ -111,24 +115,28 @@ const TreeRow kTree[] = {
 extern "C" SYSTEM_EXPORT void AutoCli_RegisterNamespaces(
     boost::shared_ptr<Kitbase::AutoCli::NamespaceNode> root) {
     using namespace TarselCli::System;
-    std::map<std::string, NodePtr> nodes;
+    // The table is depth first, so a row's parent is the last node seen one level up.
+    std::vector<std::pair<std::string, NodePtr> > open;  // path and node, by depth
     for (const TreeRow& row : kTree) {
         const std::string path = row.path;
         const std::string::size_type blank = path.rfind(' ');
-        if (blank == std::string::npos) {
-            NodePtr top = root->SubNamespace(path);
-            top->SetDescription(row.description);
-            nodes[path] = top;
-            continue;
-        }
+        const std::size_t depth = static_cast<std::size_t>(std::count(path.begin(), path.end(), ' '));
         NodePtr node;
-        if (row.factory) {
-            node = row.factory();
-        } else {
-            node = Kitbase::AutoCli::Namespace::New();
+        if (blank == std::string::npos) {
+            node = root->SubNamespace(path);
             node->SetDescription(row.description);
+        } else {
+            if (depth > open.size() || open[depth - 1].first != path.substr(0, blank))
+                throw std::logic_error("the tree table is not depth first at '" + path + "'");
+            if (row.factory) {
+                node = row.factory();
+            } else {
+                node = Kitbase::AutoCli::Namespace::New();
+                node->SetDescription(row.description);
+            }
+            open[depth - 1].second->RegisterNamespaceNode(node, path.substr(blank + 1));
         }
-        nodes.at(path.substr(0, blank))->RegisterNamespaceNode(node, path.substr(blank + 1));
-        nodes[path] = node;
+        open.resize(depth);
+        open.emplace_back(path, node);
     }
 }
