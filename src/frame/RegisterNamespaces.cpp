@@ -14,6 +14,10 @@
 // processes and security policy
 
 // SNMP agent
+#include "snmp/SnmpAgentGet.h"
+#include "snmp/SnmpAgentHash.h"
+#include "snmp/SnmpAgentSet.h"
+#include "snmp/SnmpAgentTest.h"
 
 // power and maintenance
 
@@ -82,6 +86,10 @@ const TreeRow kTree[] = {
     {"system uuid get", nullptr, &Make<UuidGet>},
     {"system hostname", "Operations pertaining the network name of the Quarn host.", nullptr},
     {"system snmp", "Commands pertaining to SNMPv1/v2c/v3 Agent configuration.", nullptr},
+    {"system snmp set", nullptr, &Make<SnmpAgentSet>},
+    {"system snmp get", nullptr, &Make<SnmpAgentGet>},
+    {"system snmp test", nullptr, &Make<SnmpAgentTest>},
+    {"system snmp hash", nullptr, &Make<SnmpAgentHash>},
     {"system shutdown", "Command to shutdown the system.", nullptr},
     {"system maintenanceMode", "Command to manage the system's maintenance mode.", nullptr},
 };
