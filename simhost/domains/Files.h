@@ -36,8 +36,8 @@ struct DefaultFile {
     const unsigned char* bytes;
     std::size_t size;
 };
-extern const DefaultFile kDefaultFiles[];
-extern const std::size_t kDefaultFileCount;
+SIMHOST_API extern const DefaultFile kDefaultFiles[];
+SIMHOST_API extern const std::size_t kDefaultFileCount;
 
 // Whether path is a normalised absolute host path as the section requires.
 SIMHOST_API bool IsNormalPath(const std::string& path);
