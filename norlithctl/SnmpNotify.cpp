@@ -111,9 +111,17 @@ void SetUser(netsnmp_session& settings, const Destination& to, std::vector<u_cha
     settings.securityLevel = to.level == "priv"   ? SNMP_SEC_LEVEL_AUTHPRIV
                              : to.level == "auth" ? SNMP_SEC_LEVEL_AUTHNOPRIV
                                                   : SNMP_SEC_LEVEL_NOAUTH;
-    engine.assign(to.engine_id.begin(), to.engine_id.end());
-    settings.securityEngineID = engine.data();
-    settings.securityEngineIDLen = engine.size();
+    if (!to.inform) {
+        // The sender of a trap is the authoritative engine: the keys' engine, with its boots and
+        // time in the message.
+        engine.assign(to.engine_id.begin(), to.engine_id.end());
+        settings.securityEngineID = engine.data();
+        settings.securityEngineIDLen = engine.size();
+        settings.engineBoots = 1;
+        settings.engineTime = static_cast<u_int>(uptime_ticks / 100);
+    }
+    // The receiver of an inform is: its engine id, boots and time are discovered first, and the
+    // keys only work when its engine is the one they were localized to.
     if (to.level != "none") {
         if (to.auth_protocol == "MD5") {
             settings.securityAuthProto = usmHMACMD5AuthProtocol;
@@ -132,11 +140,6 @@ void SetUser(netsnmp_session& settings, const Destination& to, std::vector<u_cha
         priv.assign(to.priv_key.begin(), to.priv_key.end());
         settings.securityPrivLocalKey = priv.data();
         settings.securityPrivLocalKeyLen = priv.size();
-    }
-    if (!to.inform) {
-        // The sender of a trap is the authoritative engine: its boots and time go in the message.
-        settings.engineBoots = 1;
-        settings.engineTime = static_cast<u_int>(uptime_ticks / 100);
     }
 }
 
