@@ -42,13 +42,17 @@ void SetUpLibrary() {
     });
 }
 
-// The library's session text after a failure, freed here.
+std::string NoAnswer() { return "no answer within " + std::to_string(kInformTimeoutSeconds) + " seconds"; }
+
+// The library's text for a failure (of opening a session, or of an exchange on it), freed here.
+// An inform first discovers the receiver's engine, so a receiver that does not answer shows as
+// the library's timeout.
 std::string SessionError(netsnmp_session* session) {
     int library = 0;
     int system = 0;
     char* text = nullptr;
-    snmp_error(session, &library, &system, &text);
-    std::string message = text ? text : "unknown error";
+    snmp_error(session, &system, &library, &text);
+    std::string message = library == SNMPERR_TIMEOUT ? NoAnswer() : text ? text : "unknown error";
     std::free(text);
     return message;
 }
@@ -57,8 +61,8 @@ std::string HandleError(void* handle) {
     int library = 0;
     int system = 0;
     char* text = nullptr;
-    snmp_sess_error(handle, &library, &system, &text);
-    std::string message = text ? text : "unknown error";
+    snmp_sess_error(handle, &system, &library, &text);
+    std::string message = library == SNMPERR_TIMEOUT ? NoAnswer() : text ? text : "unknown error";
     std::free(text);
     return message;
 }
@@ -178,7 +182,7 @@ std::string SendWarmStart(const Destination& to, unsigned long uptime_ticks) {
     int status = snmp_sess_synch_response(session.get(), pdu, &response);
     std::string problem;
     if (status == STAT_TIMEOUT)
-        problem = "no acknowledgement within " + std::to_string(kInformTimeoutSeconds) + " seconds";
+        problem = NoAnswer();
     else if (status != STAT_SUCCESS)
         problem = HandleError(session.get());
     else if (response && response->errstat != SNMP_ERR_NOERROR)

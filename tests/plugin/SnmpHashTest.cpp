@@ -326,7 +326,7 @@ TEST_F(SnmpHash, AnUndeliveredNotificationIsAnErrorNotANormalEnd) {
     plugintest::Run run = Invoke("system snmp test");
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(6));
     EXPECT_EQ(Errors(run), std::vector<std::string>{"The warmStart notification was not delivered to 127.0.0.1@16299 "
-                                                    "(SNMPv3 inform as 'relay'): no acknowledgement within 3 seconds"});
+                                                    "(SNMPv3 inform as 'relay'): no answer within 3 seconds"});
     EXPECT_FALSE(run.output->GetResult());
     EXPECT_EQ(run.leaked, 0);
 }
