@@ -324,7 +324,16 @@ public:
 
     std::unique_ptr<Section> Parse(const nlohmann::json* value, const Location& at) const override {
         std::vector<Entry> entries;
-        if (value) {
+        if (!value) {
+            for (std::size_t i = 0; i < kDefaultFileCount; ++i) {
+                Entry entry;
+                entry.path = kDefaultFiles[i].path;
+                entry.content.assign(reinterpret_cast<const char*>(kDefaultFiles[i].bytes), kDefaultFiles[i].size);
+                entry.size = entry.content.size();
+                entry.mode = DefaultMode(entry.type);
+                entries.push_back(std::move(entry));
+            }
+        } else {
             if (!value->is_array()) at.Fail("expected an array");
             for (std::size_t i = 0; i < value->size(); ++i) {
                 Entry entry = ParseEntry((*value)[i], at.Index(i));

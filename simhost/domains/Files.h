@@ -1,6 +1,7 @@
 // The files domain: the host's own files under root/, as a scenario section.
 //
-// Scenario section "files" (default []): an array of entries, each naming a path the host sees
+// Scenario section "files" (default: the files below simhost/defaults/root/ of the source tree,
+// embedded at build time, each a regular file of mode 0644): an array of entries, each naming a path the host sees
 // (absolute, normalised: no "." or ".." components, no doubled or trailing "/", components of at
 // most 255 bytes, the whole at most 4095 bytes):
 //   {"path": "/etc/motd", "text": "...", "mode": "0644"}      a regular file with UTF-8 text
@@ -17,6 +18,8 @@
 
 #include <simhost/State.h>
 
+#include <cstddef>
+
 namespace simhost {
 namespace files {
 
@@ -26,6 +29,15 @@ struct Tree {
     static constexpr StateKind kKind = StateKind::kCustom;
     static const Domain& TheDomain();
 };
+
+// One file of the default host, embedded from simhost/defaults/root/ (the path is the host's).
+struct DefaultFile {
+    const char* path;
+    const unsigned char* bytes;
+    std::size_t size;
+};
+SIMHOST_API extern const DefaultFile kDefaultFiles[];
+SIMHOST_API extern const std::size_t kDefaultFileCount;
 
 // Whether path is a normalised absolute host path as the section requires.
 SIMHOST_API bool IsNormalPath(const std::string& path);

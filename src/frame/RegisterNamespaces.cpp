@@ -24,6 +24,10 @@
 #include "process/SecpolicyDomainSet.h"
 
 // SNMP agent
+#include "snmp/SnmpAgentGet.h"
+#include "snmp/SnmpAgentHash.h"
+#include "snmp/SnmpAgentSet.h"
+#include "snmp/SnmpAgentTest.h"
 
 // power and maintenance
 
@@ -104,6 +108,10 @@ const TreeRow kTree[] = {
     {"system hostname set", nullptr, &Make<HostnameSet>},
     {"system hostname get", nullptr, &Make<HostnameGet>},
     {"system snmp", "Commands pertaining to SNMPv1/v2c/v3 Agent configuration.", nullptr},
+    {"system snmp set", nullptr, &Make<SnmpAgentSet>},
+    {"system snmp get", nullptr, &Make<SnmpAgentGet>},
+    {"system snmp test", nullptr, &Make<SnmpAgentTest>},
+    {"system snmp hash", nullptr, &Make<SnmpAgentHash>},
     {"system shutdown", "Command to shutdown the system.", nullptr},
     {"system maintenanceMode", "Command to manage the system's maintenance mode.", nullptr},
 };

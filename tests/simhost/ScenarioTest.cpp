@@ -3,6 +3,7 @@
 #include "TestSupport.h"
 
 #include <simhost/Host.h>
+#include <simhost/domains/Files.h>
 #include <simhost/Scenario.h>
 
 #include <gtest/gtest.h>
@@ -59,7 +60,10 @@ TEST(ScenarioDefaults, AMissingSectionOrMemberIsTheDomainsDefault) {
     EXPECT_EQ(bare["simulation"]["sleep_percent"], 100);
     EXPECT_EQ(bare["boot"]["boot_count"], 1);
     EXPECT_TRUE(bare["mounts"].empty());
-    EXPECT_TRUE(bare["files"].empty());
+    // The default host's files are those embedded from simhost/defaults/root/.
+    ASSERT_EQ(bare["files"].size(), simhost::files::kDefaultFileCount);
+    for (std::size_t i = 0; i < simhost::files::kDefaultFileCount; ++i)
+        EXPECT_EQ(bare["files"][i]["path"], simhost::files::kDefaultFiles[i].path);
     EXPECT_FALSE(bare["observations"].empty());
     // A section overlays the default member by member; a list replaces the default list.
     nlohmann::json partial =

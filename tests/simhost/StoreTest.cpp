@@ -7,6 +7,7 @@
 
 #include <simhost/Db.h>
 #include <simhost/Host.h>
+#include <simhost/domains/Files.h>
 #include <simhost/Store.h>
 
 #include <gtest/gtest.h>
@@ -230,7 +231,7 @@ TEST_F(StoreTest, ARefusedReplacementLeavesDatabaseAndRootAsTheyWere) {
     host.AddFault("QuillUserLib_Init", "down");
     simhost::CloseHost();
     // root/ that is not a directory: the replacement used to be committed before root/ failed.
-    std::filesystem::remove(host.Root());
+    std::filesystem::remove_all(host.Root());
     testsupport::WriteFile(host.Root(), "not a directory");
     auto before = Snapshot(host.Dir());
     std::string message = ThrownBy([&] { host.Init(simhost::DefaultScenario(), true); });
@@ -283,7 +284,10 @@ TEST_F(StoreTest, AReplacementSwitchesRootWithTheDatabase) {
     std::filesystem::create_directories(host.Dir() + "/root.new/stale");
     host.host().Init(testsupport::ReadFile(simtest::ScenarioFile("stateless.json")), true);
     EXPECT_TRUE(std::filesystem::is_directory(host.host().Root()));
-    EXPECT_TRUE(std::filesystem::is_empty(host.host().Root()));
+    // root/ holds the new host's files only: the default ones, not the old host's.
+    EXPECT_FALSE(std::filesystem::exists(host.host().Root() + "/old"));
+    EXPECT_FALSE(std::filesystem::exists(host.host().Root() + "/stale"));
+    EXPECT_TRUE(std::filesystem::exists(host.host().Root() + std::string(simhost::files::kDefaultFiles[0].path)));
     EXPECT_FALSE(std::filesystem::exists(host.Dir() + "/root.new"));
     EXPECT_TRUE(simtest::Holds(host.host().Export(), testsupport::ReadFile(simtest::ScenarioFile("stateless.json"))));
 }
@@ -313,7 +317,7 @@ TEST_F(StoreTest, SymbolicLinksInTheStateDirectoryAreRefused) {
     EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere.lock"));
 
     std::filesystem::copy(real.Dir(), dir / "root", std::filesystem::copy_options::recursive);
-    std::filesystem::remove(dir / "root/root");
+    std::filesystem::remove_all(dir / "root/root");
     std::filesystem::create_directory_symlink(dir / "real/root", dir / "root/root");
     expect_refused(dir / "root", dir / "root/root");
 
