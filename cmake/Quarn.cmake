@@ -28,7 +28,7 @@ function(quarn_plugin_host target)
   target_link_options(${target} PRIVATE "SHELL:-Wl,--whole-archive $<TARGET_FILE:kitbase> \
 $<TARGET_FILE:norlithctl> $<TARGET_FILE:norlithuser> -Wl,--no-whole-archive")
   set_target_properties(${target} PROPERTIES ENABLE_EXPORTS ON)
-  target_link_options(${target} PRIVATE "LINKER:--exclude-libs,libsqlite3.a")
+  target_link_options(${target} PRIVATE "LINKER:--exclude-libs,libsqlite3.a:libpugixml.a")
 endfunction()
 
 include(CheckLinkerFlag)
@@ -46,10 +46,10 @@ function(quarn_static_runtime target)
   endif()
 endfunction()
 
-# A plug-in: a module of hidden visibility that compiles against the framework's and the
+# A loadable module of hidden visibility that compiles against the framework's and the
 # host-control library's headers and links neither them nor the C++ runtime (the program that
-# loads it provides them).
-function(quarn_add_plugin target)
+# loads it provides them): the plug-ins, and the host-control library's own modules.
+function(quarn_add_module target)
   add_library(${target} MODULE ${ARGN})
   target_include_directories(${target} PRIVATE ${PROJECT_SOURCE_DIR}/include)
   # No default libraries (the C++ runtime among them): only the C library and the unwinder.
@@ -59,4 +59,9 @@ function(quarn_add_plugin target)
     PREFIX "lib"
     CXX_VISIBILITY_PRESET hidden
     VISIBILITY_INLINES_HIDDEN ON)
+endfunction()
+
+# A plug-in of quarncli.
+function(quarn_add_plugin target)
+  quarn_add_module(${target} ${ARGN})
 endfunction()

@@ -2,8 +2,9 @@
 // that key bound to one engine (localization), for the MD5 and SHA1 authentication protocols,
 // and the AES-128 privacy key derived from a secret in the same way and cut to 16 octets.
 //
-// Pure functions over byte strings, computed with OpenSSL's digests; nothing is kept. Keys and
-// secrets are returned, never logged. Internal to the host-control library.
+// Pure functions over byte strings; the digests are OpenSSL's, in the SNMP support module
+// (SnmpModule.h), loaded when a key is first made. Nothing is kept. Keys and secrets are returned,
+// never logged. Internal to the host-control library.
 #pragma once
 
 #include <string>
@@ -16,14 +17,9 @@ enum class Digest { kMd5, kSha1 };
 // The digest's output length in octets: 16 (MD5) or 20 (SHA1).
 std::size_t DigestLength(Digest digest);
 
-// The master key of a secret: the digest of one megabyte of the secret repeated. secret must not
-// be empty.
-std::string PasswordToKey(Digest digest, const std::string& secret);
-
-// A master key localized to an engine: digest(key + engine_id + key).
-std::string LocalizeKey(Digest digest, const std::string& key, const std::string& engine_id);
-
-// The localized authentication key of a secret for an engine (both steps above).
+// The localized authentication key of a secret for an engine: the master key of the secret (the
+// digest of one megabyte of the secret repeated; secret must not be empty), localized to the
+// engine (digest of key + engine id + key). Computed by the SNMP support module (SnmpModule.h).
 std::string LocalizedAuthKey(Digest digest, const std::string& secret, const std::string& engine_id);
 
 // The AES-128 privacy key of a secret for an engine: the localized key of the authentication

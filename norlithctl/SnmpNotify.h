@@ -5,8 +5,9 @@
 // A trap counts as delivered once its datagram has left; an inform once the receiver has
 // acknowledged it, waiting at most kInformTimeoutSeconds in all (a few tries). Nothing here
 // blocks longer. The library is set up once per process without reading any configuration file
-// or MIB and without writing persistent state. Keys are taken as given and never logged.
-// Internal to the host-control library.
+// or MIB and without writing persistent state. Keys are taken as given and never logged. The
+// sending is done by the SNMP support module (SnmpModule.h), loaded on first use. Internal to the
+// host-control library.
 #pragma once
 
 #include <string>

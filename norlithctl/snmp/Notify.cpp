@@ -1,4 +1,7 @@
-#include "SnmpNotify.h"
+// Sending the test notification (SnmpNotify.h) with Net-SNMP's library. Part of the SNMP support
+// module, so that programs that never send one never load Net-SNMP.
+#include "../SnmpModule.h"
+#include "../SnmpNotify.h"
 
 #include <net-snmp/net-snmp-config.h>
 #include <net-snmp/net-snmp-includes.h>
@@ -9,8 +12,11 @@
 #include <vector>
 
 namespace norlithctl {
-namespace snmpnotify {
+namespace snmpmodule {
 namespace {
+
+using snmpnotify::Destination;
+using snmpnotify::kInformTimeoutSeconds;
 
 const char kAppType[] = "quarn-snmp-test";
 
@@ -191,5 +197,5 @@ std::string SendWarmStart(const Destination& to, unsigned long uptime_ticks) {
     return problem;
 }
 
-}  // namespace snmpnotify
+}  // namespace snmpmodule
 }  // namespace norlithctl
