@@ -37,6 +37,7 @@
 #include <optional>
 #include <string>
 #include <type_traits>
+#include <unordered_set>
 #include <utility>
 #include <vector>
 
@@ -272,10 +273,12 @@ public:
         std::vector<T> items = T::Default();
         if (value) Codec<std::vector<T>>::Read(*value, at, items);
         if constexpr (T::kKind == StateKind::kCollection) {
+            // One pass with a set: a scenario may hold a hundred thousand items.
+            std::unordered_set<std::string> keys;
+            keys.reserve(items.size());
             for (std::size_t i = 0; i < items.size(); ++i)
-                for (std::size_t j = 0; j < i; ++j)
-                    if (items[j].Key() == items[i].Key())
-                        at.Index(i).Fail("'" + items[i].Key() + "' appears twice");
+                if (!keys.insert(items[i].Key()).second)
+                    at.Index(i).Fail("'" + items[i].Key() + "' appears twice");
         }
         return std::make_unique<ListSection<T>>(std::move(items));
     }

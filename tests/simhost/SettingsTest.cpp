@@ -97,6 +97,10 @@ TEST(AdvancedTree, AScenarioRoundTripsAndOnlyItsOwnMembersAreWritten) {
     scenario["advanced"]["options"].push_back({{"path", "/Odd"}, {"type", 9}, {"value", "blob"},
                                               {"description", "opaque"}, {"typed", false},
                                               {"user", true}, {"read_error", "gone"}});
+    // Text that needs escaping in the stored form comes back byte for byte.
+    const std::string tricky = "quote \" back\\slash /tab\t\x01 caf\xc3\xa9 \xf0\x9f\x98\x80 \x7f end";
+    scenario["advanced"]["options"].push_back({{"path", "/Tricky"}, {"type", "string"}, {"description", tricky},
+                                              {"value", tricky.substr(0, 12)}});
     simhost::TempHost host(scenario.dump());
     json advanced = Export(host)["advanced"];
     EXPECT_EQ(advanced["branches"], json({"/Net", "/Net/Tcp"}));
@@ -105,6 +109,10 @@ TEST(AdvancedTree, AScenarioRoundTripsAndOnlyItsOwnMembersAreWritten) {
     EXPECT_EQ(advanced["options"][1]["value"], "cubic");
     EXPECT_EQ(advanced["options"][2], json::parse(R"({"path": "/Odd", "type": 9, "description": "opaque",
         "value": "blob", "user": true, "typed": false, "read_error": "gone"})"));
+    EXPECT_EQ(advanced["options"][3]["description"], tricky);
+    OptionPtr found = Find("/Tricky");
+    EXPECT_EQ(found->GetDescription(), tricky);
+    EXPECT_EQ(dynamic_cast<Ravel::Adv::AdvancedStringOption&>(*found).GetValue(), tricky.substr(0, 12));
     std::string exported = host.host().Export();
     host.host().Init(exported, true);
     EXPECT_EQ(host.host().Export(), exported);
