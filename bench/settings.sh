@@ -78,11 +78,11 @@ echo "== lists of generated hosts"
 make_host empty 0
 for n in 1000 10000 100000; do make_host "h$n" "$n"; done
 for command in "advanced list" "kernel list"; do
-  read -r base_ms < <(median_ms "$cli --host-state $work/empty system settings $command")
+  read -r base_ms < <(RUNS=40 median_ms "$cli --host-state $work/empty system settings $command")
   base_kib="$(peak_kib "$cli" --host-state "$work/empty" system settings $command)"
   printf "%-14s rows  median ms  peak KiB  us/row above empty  KiB/row above empty\n" "$command"
   for n in 1000 10000 100000; do
-    runs=15; [ "$n" = 100000 ] && runs=5
+    runs=40; [ "$n" = 10000 ] && runs=15; [ "$n" = 100000 ] && runs=5
     read -r ms < <(RUNS=$runs WARMUP=1 median_ms "$cli --host-state $work/h$n system settings $command")
     kib="$(peak_kib "$cli" --host-state "$work/h$n" system settings $command)"
     awk -v n="$n" -v ms="$ms" -v kib="$kib" -v bms="$base_ms" -v bkib="$base_kib" 'BEGIN {
