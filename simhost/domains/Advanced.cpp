@@ -4,6 +4,7 @@
 
 #include <simhost/Events.h>
 
+#include <algorithm>
 #include <cstdio>
 
 #include <unordered_set>
@@ -90,10 +91,9 @@ std::string RangeOf(const Option& option) {
 //
 // A stored option is a JSON array of its members by position (no member names to parse or look
 // up): listing a large tree decodes every option, so this is where a listing spends its time.
-// It is read with a SAX handler straight into an Option, without building a document.
-
-enum Field { kPath, kKind, kDescription, kValue, kDefault, kMin, kMax, kText, kTextDefault,
-             kValidCharacters, kUser, kTyped, kReadError, kFieldCount };
+// It is read straight into an Option, without building a document. The members, in order: path,
+// kind, description, value, default, min, max, text, text default, valid characters, user,
+// typed, read error.
 
 std::string Encode(const Option& option) {
     json stored = json::array({option.path, option.kind, option.description, option.value,
@@ -103,72 +103,135 @@ std::string Encode(const Option& option) {
     return stored.dump(-1, ' ', false, json::error_handler_t::strict);
 }
 
-class StoredReader : public nlohmann::json_sax<json> {
+// Reads the stored array back. It reads only what Encode writes (JSON text as the host wrote
+// it: strings with the escapes nlohmann writes, unsigned integers, true and false); anything
+// else makes it fail, and the state counts as damaged.
+class StoredReader {
 public:
-    explicit StoredReader(Option& option) : option_(option) {}
-    bool Complete() const { return field_ == kFieldCount && depth_ == 0; }
+    explicit StoredReader(const std::string& text)
+        : at_(text.data()), end_(text.data() + text.size()) {}
 
-    bool null() override { return false; }
-    bool boolean(bool value) override {
-        if (field_ == kUser) option_.user = value;
-        else if (field_ == kTyped) option_.typed = value;
-        else return false;
-        return ++field_, true;
-    }
-    bool number_integer(number_integer_t value) override {
-        return value >= 0 && number_unsigned(static_cast<number_unsigned_t>(value));
-    }
-    bool number_unsigned(number_unsigned_t value) override {
-        if (field_ == kKind) {
-            if (value > kMaxKind) return false;
-            option_.kind = static_cast<int>(value);
-            return ++field_, true;
-        }
-        if (value > UINT32_MAX) return false;
-        std::uint32_t number = static_cast<std::uint32_t>(value);
-        switch (field_) {
-        case kValue: option_.value = number; break;
-        case kDefault: option_.default_value = number; break;
-        case kMin: option_.min = number; break;
-        case kMax: option_.max = number; break;
-        default: return false;
-        }
-        return ++field_, true;
-    }
-    bool number_float(number_float_t, const string_t&) override { return false; }
-    bool string(string_t& value) override {
-        switch (field_) {
-        case kPath: option_.path = std::move(value); break;
-        case kDescription: option_.description = std::move(value); break;
-        case kText: option_.text = std::move(value); break;
-        case kTextDefault: option_.text_default = std::move(value); break;
-        case kValidCharacters: option_.valid_characters = std::move(value); break;
-        case kReadError: option_.read_error = std::move(value); break;
-        default: return false;
-        }
-        return ++field_, true;
-    }
-    bool binary(binary_t&) override { return false; }
-    bool start_object(std::size_t) override { return false; }
-    bool key(string_t&) override { return false; }
-    bool end_object() override { return false; }
-    bool start_array(std::size_t) override { return depth_++ == 0 && field_ == 0; }
-    bool end_array() override { return --depth_ == 0; }
-    bool parse_error(std::size_t, const std::string&, const nlohmann::detail::exception&) override {
-        return false;
+    bool Read(Option& option) {
+        std::uint64_t kind = 0, value = 0, def = 0, min = 0, max = 0;
+        bool ok = Take('[') && String(option.path) && Take(',') && Unsigned(kind, kMaxKind) &&
+                  Take(',') && String(option.description) && Take(',') &&
+                  Unsigned(value, UINT32_MAX) && Take(',') && Unsigned(def, UINT32_MAX) &&
+                  Take(',') && Unsigned(min, UINT32_MAX) && Take(',') && Unsigned(max, UINT32_MAX) &&
+                  Take(',') && String(option.text) && Take(',') && String(option.text_default) &&
+                  Take(',') && String(option.valid_characters) && Take(',') && Bool(option.user) &&
+                  Take(',') && Bool(option.typed) && Take(',') && String(option.read_error) &&
+                  Take(']') && at_ == end_;
+        option.kind = static_cast<int>(kind);
+        option.value = static_cast<std::uint32_t>(value);
+        option.default_value = static_cast<std::uint32_t>(def);
+        option.min = static_cast<std::uint32_t>(min);
+        option.max = static_cast<std::uint32_t>(max);
+        return ok;
     }
 
 private:
-    Option& option_;
-    int field_ = 0;
-    int depth_ = 0;
+    bool Take(char c) {
+        if (at_ == end_ || *at_ != c) return false;
+        ++at_;
+        return true;
+    }
+    bool Unsigned(std::uint64_t& out, std::uint64_t max) {
+        if (at_ == end_ || *at_ < '0' || *at_ > '9') return false;
+        out = 0;
+        while (at_ != end_ && *at_ >= '0' && *at_ <= '9') {
+            out = out * 10 + static_cast<unsigned>(*at_++ - '0');
+            if (out > max) return false;
+        }
+        return true;
+    }
+    bool Bool(bool& out) {
+        static const char kTrue[] = "true", kFalse[] = "false";
+        if (end_ - at_ >= 4 && std::equal(kTrue, kTrue + 4, at_)) {
+            at_ += 4;
+            return out = true, true;
+        }
+        if (end_ - at_ >= 5 && std::equal(kFalse, kFalse + 5, at_)) {
+            at_ += 5;
+            return out = false, true;
+        }
+        return false;
+    }
+    bool Hex4(unsigned& out) {
+        if (end_ - at_ < 4) return false;
+        out = 0;
+        for (int i = 0; i < 4; ++i) {
+            char c = *at_++;
+            unsigned digit = c >= '0' && c <= '9'   ? static_cast<unsigned>(c - '0')
+                             : c >= 'a' && c <= 'f' ? static_cast<unsigned>(c - 'a' + 10)
+                             : c >= 'A' && c <= 'F' ? static_cast<unsigned>(c - 'A' + 10)
+                                                    : 16u;
+            if (digit == 16) return false;
+            out = out * 16 + digit;
+        }
+        return true;
+    }
+    void Utf8(unsigned code, std::string& out) {
+        if (code < 0x80) {
+            out += static_cast<char>(code);
+        } else if (code < 0x800) {
+            out += static_cast<char>(0xC0 | (code >> 6));
+            out += static_cast<char>(0x80 | (code & 0x3F));
+        } else if (code < 0x10000) {
+            out += static_cast<char>(0xE0 | (code >> 12));
+            out += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
+            out += static_cast<char>(0x80 | (code & 0x3F));
+        } else {
+            out += static_cast<char>(0xF0 | (code >> 18));
+            out += static_cast<char>(0x80 | ((code >> 12) & 0x3F));
+            out += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
+            out += static_cast<char>(0x80 | (code & 0x3F));
+        }
+    }
+    bool Escape(std::string& out) {
+        if (at_ == end_) return false;
+        switch (char c = *at_++) {
+        case '"': case '\\': case '/': out += c; return true;
+        case 'b': out += '\b'; return true;
+        case 'f': out += '\f'; return true;
+        case 'n': out += '\n'; return true;
+        case 'r': out += '\r'; return true;
+        case 't': out += '\t'; return true;
+        case 'u': {
+            unsigned code = 0, low = 0;
+            if (!Hex4(code)) return false;
+            if (code >= 0xD800 && code < 0xDC00) {
+                if (!Take('\\') || !Take('u') || !Hex4(low) || low < 0xDC00 || low >= 0xE000) return false;
+                code = 0x10000 + ((code - 0xD800) << 10) + (low - 0xDC00);
+            } else if (code >= 0xDC00 && code < 0xE000) {
+                return false;
+            }
+            Utf8(code, out);
+            return true;
+        }
+        default: return false;
+        }
+    }
+    bool String(std::string& out) {
+        if (!Take('"')) return false;
+        out.clear();
+        for (;;) {
+            const char* run = at_;
+            while (at_ != end_ && *at_ != '"' && *at_ != '\\') ++at_;
+            out.append(run, at_);
+            if (at_ == end_) return false;
+            if (*at_++ == '"') return true;
+            if (!Escape(out)) return false;
+        }
+    }
+
+    const char* at_;
+    const char* end_;
 };
 
 // The stored option, or a damaged-state error when it cannot be read back.
 Option Decode(const std::string& text) {
     Option option;
-    StoredReader reader(option);
-    if (!json::sax_parse(text, &reader) || !reader.Complete() || !IsOptionPath(option.path))
+    if (!StoredReader(text).Read(option) || !IsOptionPath(option.path))
         throw HostDamaged("The simulated host's state is damaged: an advanced option cannot be "
                           "read; recreate the host with 'quarnhost init --force'");
     return option;
