@@ -5,6 +5,7 @@
 #include <simhost/domains/Processes.h>
 
 #include <memory>
+#include <optional>
 
 namespace Ravel {
 namespace Resource {
@@ -36,6 +37,23 @@ public:
     std::string GetWorldType() const override { return world_.type; }
     std::string GetWorldState() const override { return world_.state; }
     std::uint32_t GetSecurityDomainId() const override { return world_.security_domain_id; }
+
+    // A world is read-only: nothing is ever staged on it.
+    void Refresh() override {
+        norlithctl::HostCall([&] {
+            simhost::Call call(simhost::Op::WorldImpl_Refresh, simhost::Args().Add("id", world_.id));
+            std::optional<WorldState> now = call.Items<WorldState>().Find(world_.Key());
+            if (!now) throw simhost::HostError("World " + std::to_string(world_.id) + " no longer exists");
+            world_ = std::move(*now);
+        });
+    }
+    void Commit() override {}
+    bool HasPendingChanges() override { return false; }
+    void DiscardChanges() override {}
+    std::string GetName() override { return world_.name; }
+    std::string ToString() override {
+        return "world " + std::to_string(world_.id) + " (" + world_.name + ")";
+    }
 
 private:
     WorldState world_;

@@ -50,11 +50,16 @@ void ForEachItemWithPrefix(Db& db, const char* domain, const std::string& prefix
     // Keys starting with prefix lie in [prefix, prefix with its last byte raised by one).
     std::string end = prefix;
     while (!end.empty() && static_cast<unsigned char>(end.back()) == 0xFF) end.pop_back();
-    Query select = db.Cached(
-        "SELECT key, value FROM items WHERE domain = ?1 AND key >= ?2 AND (?3 = '' OR key < ?3) "
-        "ORDER BY id");
+    // Two statements rather than one with "(?3 = '' OR key < ?3)": SQLite cannot use a bound
+    // hidden in an OR, and would read every key from the prefix to the end of the domain.
+    Query select = end.empty()
+                       ? db.Cached("SELECT key, value FROM items WHERE domain = ?1 AND key >= ?2 "
+                                   "ORDER BY id")
+                       : db.Cached("SELECT key, value FROM items WHERE domain = ?1 AND key >= ?2 "
+                                   "AND key < ?3 ORDER BY id");
     if (!end.empty()) end.back() = static_cast<char>(static_cast<unsigned char>(end.back()) + 1);
-    select->Bind(1, std::string(domain)).Bind(2, prefix).Bind(3, end);
+    select->Bind(1, std::string(domain)).Bind(2, prefix);
+    if (!end.empty()) select->Bind(3, end);
     while (select->Step()) fn(select->Text(0), select->Text(1));
 }
 

@@ -10,6 +10,7 @@
 #include <norlithctl/Testing.h>
 
 #include <string>
+#include <vector>
 
 namespace NorlithCtl {
 namespace System {
@@ -38,6 +39,17 @@ public:
     // ---- maintenance mode
 
     // ---- keyboard layouts
+
+    // The layout in use now ("" when the host offers none).
+    virtual std::string GetKeyboardLayout();
+    // The layouts the host offers, in its order.
+    virtual std::vector<std::string> GetKeyboardLayouts();
+    // Stores the layout the host uses from the next boot. Names match without regard to case;
+    // a layout the host does not offer is refused.
+    virtual void SetKeyboardLayout(const std::string& layout);
+    // Applies a layout's key mappings now, for this boot only; "" applies the layout in use
+    // again. A layout the host does not offer is refused.
+    virtual void LoadKeyboardMappings(const std::string& layout);
 
     // ---- modules and log levels
 

@@ -4,6 +4,7 @@
 #include <norlithctl/Export.h>
 
 #include <string>
+#include <vector>
 
 namespace NorlithCtl {
 namespace Util {
@@ -27,6 +28,14 @@ namespace Util {
 // operation, or no process can be created.
 NORLITHCTL_API int NorlithCtl_Exec(const std::string& command, bool background, bool quiet,
                                    bool trace);
+
+// Splits value into the components between separators and appends them, in order, to tokens.
+// Every character of separators separates ("/" splits paths, " ,;" would split lists). Empty
+// components are dropped: separators at the start or end, or several in a row, yield nothing, so
+// "/Net//Tcp/" gives "Net" and "Tcp", and "" or "/" gives no component at all. Pure; nothing
+// throws but std::bad_alloc.
+NORLITHCTL_API void StringTokenize(const std::string& value, std::vector<std::string>& tokens,
+                                   const std::string& separators);
 
 }  // namespace Util
 }  // namespace NorlithCtl

@@ -32,6 +32,13 @@
 // power and maintenance
 
 // kernel settings
+#include "settings/SettingsAdvancedList.h"
+#include "settings/SettingsAdvancedSet.h"
+#include "settings/SettingsKernelList.h"
+#include "settings/SettingsKernelSet.h"
+#include "settings/SettingsKeyboardLayoutGet.h"
+#include "settings/SettingsKeyboardLayoutList.h"
+#include "settings/SettingsKeyboardLayoutSet.h"
 
 // kernel modules
 
@@ -71,9 +78,16 @@ const TreeRow kTree[] = {
     {"system boot device get", nullptr, &Make<BootDeviceGet>},
     {"system settings", "Operations that allow viewing and manipulation of system settings.", nullptr},
     {"system settings kernel", "Operations that allow viewing and manipulation of system kernel settings.", nullptr},
+    {"system settings kernel list", nullptr, &Make<SettingsKernelList>},
+    {"system settings kernel set", nullptr, &Make<SettingsKernelSet>},
     {"system settings advanced", "The advanced settings are a set of Norlith options that specific configuration settings to be modified. These options are typically in place for specific workarounds or debugging.", nullptr},
+    {"system settings advanced list", nullptr, &Make<SettingsAdvancedList>},
+    {"system settings advanced set", nullptr, &Make<SettingsAdvancedSet>},
     {"system settings keyboard", "Operations that relate to the keyboard", nullptr},
     {"system settings keyboard layout", "Operations that relate to keyboard layout", nullptr},
+    {"system settings keyboard layout get", nullptr, &Make<SettingsKeyboardLayoutGet>},
+    {"system settings keyboard layout set", nullptr, &Make<SettingsKeyboardLayoutSet>},
+    {"system settings keyboard layout list", nullptr, &Make<SettingsKeyboardLayoutList>},
     {"system module", "Operations that allow manipulation of the Norlith loadable modules and device drivers. Operations include load, list and setting options.", nullptr},
     {"system module parameters", "Operations that allow manipulation of parameters of Norlith loadable modules and device drivers. Operations include list and set options.", nullptr},
     {"system coredump", "Operations pertaining to the Norlith Core dump configuration. ", nullptr},

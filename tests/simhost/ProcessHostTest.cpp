@@ -236,6 +236,27 @@ TEST_F(ProcessHostTest, WorldsComeOutInTheHostsOrderAndTheCallerOwnsThem) {
     EXPECT_EQ(NorlithCtl::Testing::LiveObjects(), live);
 }
 
+TEST_F(ProcessHostTest, AWorldIsAReadOnlySnapshotThatRefreshReadsAgain) {
+    host_.host().Init(R"({"format": 1, "worlds": [
+        {"id": 7, "cartel_id": 7, "name": "ntpd", "state": "running"}]})", true);
+    std::vector<Ravel::Resource::World*> worlds = NorlithCtl::Resource::ResourceInfoImpl().GetAllWorlds();
+    ASSERT_EQ(worlds.size(), 1u);
+    std::unique_ptr<Ravel::Lib::RavelObject> object(worlds[0]);
+    auto* world = static_cast<Ravel::Resource::World*>(object.get());
+    EXPECT_EQ(object->GetName(), "ntpd");
+    EXPECT_EQ(object->ToString(), "world 7 (ntpd)");
+    EXPECT_FALSE(object->HasPendingChanges());
+    object->Commit();  // nothing staged: nothing happens
+    EXPECT_TRUE(host_.host().Journal().empty());
+    host_.host().Init(R"({"format": 1, "worlds": [
+        {"id": 7, "cartel_id": 7, "name": "ntpd", "state": "sleeping"}]})", true);
+    EXPECT_EQ(world->GetWorldState(), "running");
+    object->Refresh();
+    EXPECT_EQ(world->GetWorldState(), "sleeping");
+    host_.host().Init(R"({"format": 1, "worlds": []})", true);
+    EXPECT_THROW(object->Refresh(), Ravel::Lib::RavelException);
+}
+
 TEST_F(ProcessHostTest, TheSectionsRoundTripAndBadOnesAreRefusedWithTheirLocation) {
     json scenario = {{"format", 1},
                      {"dns", {{"host_name", "rt-1"}, {"domain", ""}}},

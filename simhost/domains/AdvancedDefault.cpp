@@ -1,0 +1,139 @@
+// Expands AdvancedOptions.def, the compact description of the default host's advanced options,
+// into the default tree: branches in order, then every option, series expanded number-major.
+#include <simhost/domains/Advanced.h>
+
+#include <cstdint>
+#include <string>
+
+namespace simhost {
+namespace advanced {
+namespace {
+
+#define HOST_CHARS "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789-."
+#define ID_CHARS "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789_-"
+#define LOWER_CHARS "abcdefghijklmnopqrstuvwxyz_"
+#define PATH_CHARS "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789/_-."
+#define HEX_CHARS "0123456789abcdefABCDEF:"
+#define ADDRESS_CHARS "0123456789abcdefABCDEF.:"
+#define MODEL_CHARS "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789 ,-_."
+
+enum class Row { kBranch, kInt, kString, kKind, kSeries, kField, kEnd };
+
+struct Entry {
+    Row row;
+    bool user;
+    const char* path;  // the branch of a series; the suffix of a field
+    const char* text;  // valid characters; the prefix of a series
+    std::int64_t a;    // min; kind; first number of a series
+    std::int64_t b;    // max; last number of a series
+    std::int64_t c;    // integer default
+    std::int64_t d;    // integer value
+    const char* text_default;
+    const char* text_value;
+    const char* description;
+};
+
+const Entry kEntries[] = {
+#define BRANCH(path) {Row::kBranch, false, path, "", 0, 0, 0, 0, "", "", ""},
+#define INT(path, min, max, def, value, doc) {Row::kInt, false, path, "", min, max, def, value, "", "", doc},
+#define USER_INT(path, min, max, def, value, doc) {Row::kInt, true, path, "", min, max, def, value, "", "", doc},
+#define STR(path, valid, def, value, doc) {Row::kString, false, path, valid, 0, 0, 0, 0, def, value, doc},
+#define USER_STR(path, valid, def, value, doc) {Row::kString, true, path, valid, 0, 0, 0, 0, def, value, doc},
+#define KIND(path, kind, value, doc) {Row::kKind, false, path, "", kind, 0, 0, 0, "", value, doc},
+#define SERIES(branch, prefix, first, last) {Row::kSeries, false, branch, prefix, first, last, 0, 0, "", "", ""},
+#define FIELD(suffix, min, max, def, doc) {Row::kField, false, suffix, "", min, max, def, def, "", "", doc},
+#define END() {Row::kEnd, false, "", "", 0, 0, 0, 0, "", "", ""},
+#include "AdvancedOptions.def"
+#undef BRANCH
+#undef INT
+#undef USER_INT
+#undef STR
+#undef USER_STR
+#undef KIND
+#undef SERIES
+#undef FIELD
+#undef END
+};
+
+std::string Replace(std::string text, const std::string& from, const std::string& to) {
+    for (std::size_t at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size()))
+        text.replace(at, from.size(), to);
+    return text;
+}
+
+Option Integer(const std::string& path, const Entry& entry) {
+    Option option;
+    option.path = path;
+    option.kind = kInteger;
+    option.min = static_cast<std::uint32_t>(entry.a);
+    option.max = static_cast<std::uint32_t>(entry.b);
+    option.default_value = static_cast<std::uint32_t>(entry.c);
+    option.value = static_cast<std::uint32_t>(entry.d);
+    option.description = entry.description;
+    option.user = entry.user;
+    return option;
+}
+
+// The options of one series: for each number, one per field (the entries after `series` up to
+// its END).
+void ExpandSeries(const Entry* series, const Entry* fields_end, std::vector<Option>& out) {
+    for (std::int64_t n = series->a; n <= series->b; ++n) {
+        const std::string number = std::to_string(n);
+        for (const Entry* field = series + 1; field != fields_end; ++field) {
+            Option option = Integer(std::string(series->path) + "/" + series->text + number + field->path,
+                                    *field);
+            option.description = Replace(field->description, "%n", number);
+            out.push_back(std::move(option));
+        }
+    }
+}
+
+DefaultTree Expand() {
+    DefaultTree tree;
+    const Entry* end = kEntries + sizeof kEntries / sizeof kEntries[0];
+    for (const Entry* entry = kEntries; entry != end; ++entry) {
+        switch (entry->row) {
+        case Row::kBranch:
+            tree.branches.push_back(entry->path);
+            break;
+        case Row::kInt:
+            tree.options.push_back(Integer(entry->path, *entry));
+            break;
+        case Row::kString:
+        case Row::kKind: {
+            Option option;
+            option.path = entry->path;
+            option.kind = entry->row == Row::kString ? kString : static_cast<int>(entry->a);
+            option.valid_characters = entry->text;
+            option.text_default = entry->text_default;
+            option.text = entry->text_value;
+            option.description = entry->description;
+            option.user = entry->user;
+            tree.options.push_back(std::move(option));
+            break;
+        }
+        case Row::kSeries: {
+            const Entry* fields_end = entry + 1;
+            while (fields_end != end && fields_end->row == Row::kField) ++fields_end;
+            ExpandSeries(entry, fields_end, tree.options);
+            if (fields_end == end) return tree;
+            entry = fields_end;  // the series' END
+            break;
+        }
+        case Row::kField:
+        case Row::kEnd:
+            break;
+        }
+    }
+    return tree;
+}
+
+}  // namespace
+
+const DefaultTree& Defaults() {
+    static const DefaultTree tree = Expand();
+    return tree;
+}
+
+}  // namespace advanced
+}  // namespace simhost
