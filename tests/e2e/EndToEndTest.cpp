@@ -182,7 +182,7 @@ TEST_F(EndToEnd, SchemaDescribesTheTree) {
         }
     }
     EXPECT_EQ(namespaces, 33u);
-    EXPECT_EQ(commands, 3u);
+    EXPECT_EQ(commands, 8u);
     ASSERT_FALSE(version.is_null());
     EXPECT_EQ(version["metadata"], ordered_json({{"type", "fetcher"}}));
     EXPECT_EQ(version["formatter"], "simple");

@@ -249,6 +249,7 @@ TEST_F(StoreTest, ARefusedReplacementLeavesDatabaseAndRootAsTheyWere) {
 int ReplaceWithLittleRoom(void* context) {
     const std::string& dir = *static_cast<std::string*>(context);
     nlohmann::json scenario = nlohmann::json::parse(simhost::DefaultScenario());
+    scenario["files"] = nlohmann::json::array();  // the default host's files would pass the limit
     for (int i = 0; i < 2000; ++i)
         scenario["observations"].push_back(
             {{"time", "2024-03-18T09:12:44.000Z"}, {"message", "observation " + std::to_string(i)}});
@@ -313,7 +314,7 @@ TEST_F(StoreTest, SymbolicLinksInTheStateDirectoryAreRefused) {
     EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere.lock"));
 
     std::filesystem::copy(real.Dir(), dir / "root", std::filesystem::copy_options::recursive);
-    std::filesystem::remove(dir / "root/root");
+    std::filesystem::remove_all(dir / "root/root");
     std::filesystem::create_directory_symlink(dir / "real/root", dir / "root/root");
     expect_refused(dir / "root", dir / "root/root");
 
