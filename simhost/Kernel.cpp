@@ -35,19 +35,16 @@ struct Refused {
     int error;
 };
 
-// Whether target is a mount point: in the mount table, or of a type that keeps its own.
-bool IsMountPoint(Db& db, const std::string& target) {
-    if (Items<mounts::Mount>(db).Contains(target)) return true;
-    for (const FilesystemType& type : kFilesystems)
-        if (type.mounted_at && type.mounted_at(db, target)) return true;
-    return false;
-}
-
 // The type that keeps target as one of its own mount points, or nullptr.
 const FilesystemType* OwnerOf(Db& db, const std::string& target) {
     for (const FilesystemType& type : kFilesystems)
         if (type.mounted_at && type.mounted_at(db, target)) return &type;
     return nullptr;
+}
+
+// Whether target is a mount point: in the mount table, or of a type that keeps its own.
+bool IsMountPoint(Db& db, const std::string& target) {
+    return Items<mounts::Mount>(db).Contains(target) || OwnerOf(db, target);
 }
 
 const FilesystemType* FindFilesystem(const std::string& name) {

@@ -193,10 +193,12 @@ int CheckMount(Call& call, kernel::MountRequest& request) {
     if (int error = ParseMountOptions(request.options, &options)) return error;
     Db& db = call.db();
     if (FindRamdisk(db, options.name)) return EEXIST;
-    // Reserved inodes are set aside at once: the file system must have them.
-    std::uint64_t reserved = call.Read<Status>().reserved_inodes;
+    // Reserved inodes are set aside at once: the file system must have them. (This walks every
+    // ramdisk, the one cost of a mount that grows with their number.)
+    const Status status = call.Read<Status>();
+    std::uint64_t reserved = status.reserved_inodes;
     Items<Ramdisk>(db).ForEach([&](const Ramdisk& ramdisk) { reserved += ramdisk.reserved_inodes; });
-    if (reserved + options.reserved_inodes > call.Read<Status>().total_inodes) return ENOSPC;
+    if (reserved + options.reserved_inodes > status.total_inodes) return ENOSPC;
     request.system = false;
     return 0;
 }

@@ -2,6 +2,9 @@
 
 #include <simhost/Mirafs.h>
 
+#include <unordered_map>
+#include <unordered_set>
+
 namespace simhost {
 namespace mirafs {
 namespace {
@@ -29,15 +32,16 @@ public:
     std::unique_ptr<Section> Parse(const nlohmann::json* value, const Location& at) const override {
         std::vector<Ramdisk> ramdisks = Ramdisk::Default();
         if (value) Codec<std::vector<Ramdisk>>::Read(*value, at, ramdisks);
+        std::unordered_set<std::string> names;
+        std::unordered_map<std::string, const Ramdisk*> mount_points;
         for (std::size_t i = 0; i < ramdisks.size(); ++i) {
-            for (std::size_t j = 0; j < i; ++j) {
-                if (ramdisks[j].name == ramdisks[i].name)
-                    at.Index(i).Member("name").Fail("'" + ramdisks[i].name + "' appears twice");
-                if (ramdisks[j].mount_point == ramdisks[i].mount_point)
-                    at.Index(i).Member("mount_point").Fail("'" + ramdisks[i].mount_point +
-                                                           "' is the mount point of '" +
-                                                           ramdisks[j].name + "' already");
-            }
+            const Ramdisk& ramdisk = ramdisks[i];
+            if (!names.insert(ramdisk.name).second)
+                at.Index(i).Member("name").Fail("'" + ramdisk.name + "' appears twice");
+            auto [earlier, added] = mount_points.emplace(ramdisk.mount_point, &ramdisk);
+            if (!added)
+                at.Index(i).Member("mount_point").Fail("'" + ramdisk.mount_point + "' is the mount point of '" +
+                                                       earlier->second->name + "' already");
         }
         return std::make_unique<RamdiskSection>(std::move(ramdisks));
     }
