@@ -48,7 +48,7 @@ void Sysinfo::Get(void* buffer, std::size_t size) {
                                      std::to_string(size) + " bytes, the record has " +
                                      std::to_string(node.record_size));
         if (!buffer) throw simhost::HostError("Cannot read " + NodeName(node_) + ": no buffer");
-        std::vector<unsigned char> record = node.read(call.db(), instance_path_);
+        std::vector<unsigned char> record = node.read(call, instance_path_);
         std::memcpy(buffer, record.data(), size);
     });
 }
@@ -60,7 +60,7 @@ void Sysinfo::List(std::vector<std::string>& names) {
                                                  .Add("instance", PathJson(instance_path_)));
         const simhost::SysinfoNode& node = KnownNode(node_);
         if (!node.list) throw simhost::HostError(NodeName(node_) + " has no instances");
-        for (std::string& name : node.list(call.db())) names.push_back(std::move(name));
+        for (std::string& name : node.list(call)) names.push_back(std::move(name));
     });
 }
 

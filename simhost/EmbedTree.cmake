@@ -1,26 +1,62 @@
-# Turns the files below a directory into a C++ source defining simhost::files::kDefaultFiles, a
-# table of {host path, bytes, size}, and kDefaultFileCount: the default host's files under root/.
-# Run as: cmake -DINPUT=<directory> -DOUTPUT=<file.cpp> -P this.
+# Turns the default host's files into a C++ source defining simhost::files::kDefaultFiles, a table
+# of {host path, bytes, content size, length, mode}, and kDefaultFileCount: every file below
+# INPUT (its content, mode 0644), and every line `PATH LENGTH [MODE]` of MANIFEST, which gives a
+# file below INPUT another length or mode, or adds a file without content of its own (all zeros,
+# stored sparse).
+# Run as: cmake -DINPUT=<directory> -DMANIFEST=<file> -DOUTPUT=<file.cpp> -P this.
 file(GLOB_RECURSE paths LIST_DIRECTORIES false RELATIVE "${INPUT}" "${INPUT}/*")
+set(listed "")
+if(EXISTS "${MANIFEST}")
+  file(STRINGS "${MANIFEST}" manifest_lines)
+  foreach(line ${manifest_lines})
+    if(line MATCHES "^[ \t]*(#|$)")
+      continue()
+    endif()
+    if(NOT line MATCHES "^/([^ ]+) +([0-9]+)( +([0-7]+))?$")
+      message(FATAL_ERROR "${MANIFEST}: expected PATH LENGTH [MODE], not '${line}'")
+    endif()
+    set(path "${CMAKE_MATCH_1}")
+    set(length_${path} "${CMAKE_MATCH_2}")
+    set(mode_${path} "${CMAKE_MATCH_4}")
+    list(APPEND listed "${path}")
+  endforeach()
+endif()
+list(APPEND paths ${listed})
+list(REMOVE_DUPLICATES paths)
 list(SORT paths)
 set(arrays "")
 set(rows "")
 set(index 0)
 foreach(path ${paths})
-  file(READ "${INPUT}/${path}" content HEX)
-  string(LENGTH "${content}" hex_length)
-  math(EXPR size "${hex_length} / 2")
-  string(REGEX REPLACE "([0-9a-f][0-9a-f])" "0x\\1," bytes "${content}")
-  string(REGEX REPLACE "(0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,)" "\\1\n" bytes "${bytes}")
+  set(size 0)
+  set(bytes "")
+  if(EXISTS "${INPUT}/${path}")
+    file(READ "${INPUT}/${path}" content HEX)
+    string(LENGTH "${content}" hex_length)
+    math(EXPR size "${hex_length} / 2")
+    string(REGEX REPLACE "([0-9a-f][0-9a-f])" "0x\\1," bytes "${content}")
+    string(REGEX REPLACE "(0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,0x..,)" "\\1\n" bytes "${bytes}")
+  endif()
+  set(length ${size})
+  if(DEFINED length_${path})
+    set(length ${length_${path}})
+    if(length LESS size)
+      message(FATAL_ERROR "${MANIFEST}: /${path} is shorter than its content (${size} bytes)")
+    endif()
+  endif()
+  set(mode 0644)
+  if(DEFINED mode_${path} AND NOT mode_${path} STREQUAL "")
+    set(mode "0${mode_${path}}")
+  endif()
   string(APPEND arrays "const unsigned char kFile${index}[] = {\n${bytes}0x00};\n")
-  string(APPEND rows "    {\"/${path}\", kFile${index}, ${size}},\n")
+  string(APPEND rows "    {\"/${path}\", kFile${index}, ${size}, ${length}ULL, ${mode}},\n")
   math(EXPR index "${index} + 1")
 endforeach()
 if(index EQUAL 0)
-  set(rows "    {nullptr, nullptr, 0},\n")
+  set(rows "    {nullptr, nullptr, 0, 0, 0},\n")
 endif()
 file(WRITE "${OUTPUT}.tmp"
-  "// Generated from ${INPUT}; do not edit.\n#include <simhost/domains/Files.h>\n"
+  "// Generated from ${INPUT} and ${MANIFEST}; do not edit.\n#include <simhost/domains/Files.h>\n"
   "namespace simhost {\nnamespace files {\nnamespace {\n${arrays}}  // namespace\n"
   "const DefaultFile kDefaultFiles[] = {\n${rows}};\n"
   "const std::size_t kDefaultFileCount = ${index};\n}  // namespace files\n}  // namespace simhost\n")

@@ -5,6 +5,7 @@
 #include <simhost/domains/Clock.h>
 #include <simhost/domains/Logs.h>
 #include <simhost/domains/Mounts.h>
+#include <simhost/Mirafs.h>
 
 #include <cerrno>
 #include <climits>
@@ -23,8 +24,28 @@ int MountTmpfs(Call&, MountRequest&) { return 0; }
 int UmountAny(Call&, const std::string&) { return 0; }
 
 const FilesystemType kFilesystems[] = {
-    {"tmpfs", MountTmpfs, UmountAny},
+    {"tmpfs", MountTmpfs, UmountAny, nullptr, nullptr, nullptr},
+    {"mirafs", mirafs::CheckMount, mirafs::CheckUmount, mirafs::MountedAt, mirafs::AddMount,
+     mirafs::RemoveMount},
 };
+
+// A refusal found inside a mount's or unmount's write transaction: it rolls the transaction
+// back, so that nothing is stored or journaled.
+struct Refused {
+    int error;
+};
+
+// The type that keeps target as one of its own mount points, or nullptr.
+const FilesystemType* OwnerOf(Db& db, const std::string& target) {
+    for (const FilesystemType& type : kFilesystems)
+        if (type.mounted_at && type.mounted_at(db, target)) return &type;
+    return nullptr;
+}
+
+// Whether target is a mount point: in the mount table, or of a type that keeps its own.
+bool IsMountPoint(Db& db, const std::string& target) {
+    return Items<mounts::Mount>(db).Contains(target) || OwnerOf(db, target);
+}
 
 const FilesystemType* FindFilesystem(const std::string& name) {
     for (const FilesystemType& type : kFilesystems)
@@ -118,35 +139,52 @@ int Mount(Call& call, const std::string& source, const std::string& target,
     request.options = options;
     request.flags = flags;
     if (int error = CanonicalDirectory(call.Root(), target, &request.target)) return error;
-    if (request.target == "/" || call.Items<mounts::Mount>().Contains(request.target)) return EBUSY;
-    int result = 0;
-    call.Change([&](Db& db) {
-        result = filesystem->mount(call, request);
-        if (result) return;
-        mounts::Mount mount;
-        mount.target = request.target;
-        mount.type = type;
-        mount.source = request.source;
-        mount.options = request.options;
-        mount.system = request.system;
-        Items<mounts::Mount>(db).Put(mount);
-    });
-    return result;
+    if (request.target == "/") return EBUSY;
+    try {
+        call.Change([&](Db& db) {
+            if (IsMountPoint(db, request.target)) throw Refused{EBUSY};
+            if (int error = filesystem->mount(call, request)) throw Refused{error};
+            if (filesystem->add) return filesystem->add(db, request);
+            mounts::Mount mount;
+            mount.target = request.target;
+            mount.type = type;
+            mount.source = request.source;
+            mount.options = request.options;
+            mount.system = request.system;
+            Items<mounts::Mount>(db).Put(mount);
+        });
+    } catch (const Refused& refused) {
+        return refused.error;
+    }
+    return 0;
 }
 
 int Umount(Call& call, const std::string& target) {
     if (target.empty() || !IsHostPath(target)) return target.empty() ? ENOENT : EINVAL;
     std::string canonical;
-    if (int error = CanonicalDirectory(call.Root(), target, &canonical)) return error;
-    std::optional<mounts::Mount> mount = call.Items<mounts::Mount>().Find(canonical);
-    if (!mount) return EINVAL;
-    const FilesystemType* filesystem = FindFilesystem(mount->type);
-    int result = 0;
-    call.Change([&](Db& db) {
-        if (filesystem) result = filesystem->umount(call, canonical);
-        if (!result) Items<mounts::Mount>(db).Erase(canonical);
-    });
-    return result;
+    if (int error = CanonicalDirectory(call.Root(), target, &canonical)) {
+        // A mount point whose directory root/ lacks (a ramdisk of a scenario that made no
+        // directory for it) is still found by its normalised path.
+        if (error != ENOENT || !mirafs::NormalisedMountPoint(target, &canonical) ||
+            !OwnerOf(call.db(), canonical))
+            return error;
+    }
+    try {
+        call.Change([&](Db& db) {
+            std::optional<mounts::Mount> mount = Items<mounts::Mount>(db).Find(canonical);
+            const FilesystemType* filesystem = mount ? FindFilesystem(mount->type) : OwnerOf(db, canonical);
+            if (!mount && !filesystem) throw Refused{EINVAL};
+            if (filesystem)
+                if (int error = filesystem->umount(call, canonical)) throw Refused{error};
+            if (mount)
+                Items<mounts::Mount>(db).Erase(canonical);
+            else
+                filesystem->remove(db, canonical);
+        });
+    } catch (const Refused& refused) {
+        return refused.error;
+    }
+    return 0;
 }
 
 int Kill(Call& call, long pid, int signal) {

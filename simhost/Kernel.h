@@ -7,7 +7,8 @@
 // - Sleeps last sleep_percent of their time (domain "simulation").
 // - Files are the host's, under its root/ (RootFs.h).
 // - Mounts go to the mount table (domain "mounts") after the checks a kernel makes; each file
-//   system type parses and checks its own options (the table in Kernel.cpp).
+//   system type parses and checks its own options (the table in Kernel.cpp). The memory file
+//   system "mirafs" keeps its mounts, the ramdisks, in a domain of its own (simhost/Mirafs.h).
 // - A signal to process 1: 15 (SIGTERM) reboots the host, 12 (SIGUSR2) powers it off; either
 //   way the request is recorded (domain "boot"), every domain's next-boot configuration becomes
 //   current, the host's uptime starts again, and the host is up for the next command. Other
@@ -39,13 +40,23 @@ SIMHOST_API void Syslog(Call& call, int priority, const std::string& text);
 // libraries' own records, such as a program's error output.
 SIMHOST_API void LogToHost(int priority, const std::string& text);
 
-// A file system type the simulated kernel mounts. mount checks options (the data argument) and
-// returns 0 or an errno; on 0 it may rewrite entry (options as stored, system flag) and record
-// state of its own through call. umount may refuse with an errno (EBUSY).
+// A file system type the simulated kernel mounts. Every hook runs inside the write transaction
+// of the mount or unmount, after the kernel's own checks (the target exists and is a directory,
+// and is or is not a mount point); nothing is stored when a hook refuses.
+//
+// mount checks the request's options (the data argument) and returns 0 or an errno; it may
+// rewrite the request (options as stored, system flag). umount may refuse with an errno
+// (EBUSY). A type whose mounts live in a domain of its own rather than in the mount table
+// (domain "mounts") also has mounted_at, add and remove; the kernel then asks it whether a
+// target is one of its mount points and leaves storing and forgetting its mounts to it.
+struct MountRequest;
 struct FilesystemType {
     const char* name;
-    int (*mount)(Call& call, struct MountRequest& request);
+    int (*mount)(Call& call, MountRequest& request);
     int (*umount)(Call& call, const std::string& target);
+    bool (*mounted_at)(Db& db, const std::string& target);
+    void (*add)(Db& db, const MountRequest& request);
+    void (*remove)(Db& db, const std::string& target);
 };
 
 struct MountRequest {

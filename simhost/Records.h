@@ -18,17 +18,18 @@
 
 namespace simhost {
 
-class Db;
+class Call;
 
 struct SysinfoNode {
     int id;
     const char* name;
     std::size_t record_size;
-    // The record for an instance path (empty for nodes without instances), record_size bytes.
-    // Throws HostError for an instance that does not exist.
-    std::vector<unsigned char> (*read)(Db& db, const std::vector<std::string>& instance_path);
+    // The record for an instance path (empty for nodes without instances), record_size bytes,
+    // read inside the call of the operation (its database and the host's root/). Throws
+    // HostError for an instance that does not exist.
+    std::vector<unsigned char> (*read)(Call& call, const std::vector<std::string>& instance_path);
     // The instance names; nullptr for a node without instances.
-    std::vector<std::string> (*list)(Db& db);
+    std::vector<std::string> (*list)(Call& call);
 };
 
 // The node with this identifier, or nullptr.

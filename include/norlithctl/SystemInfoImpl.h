@@ -55,6 +55,13 @@ public:
 
     // ---- read cache
 
+    // Whether the content based read cache is active now.
+    virtual bool GetCbrcRuntimeEnabled();
+    // Whether it is enabled from the next boot on.
+    virtual bool GetCbrcConfiguredEnabled();
+    // Enables or disables it from the next boot on; a reboot makes that the running state.
+    virtual void SetCbrcEnabled(bool enabled);
+
 private:
     SystemInfoImpl(const SystemInfoImpl&);
     SystemInfoImpl& operator=(const SystemInfoImpl&);

@@ -5,7 +5,8 @@
 // (code points of the shown text: cells are in the terminal escape form) in two passes over the
 // rows, writing cells straight from the meta objects. A table wider than the terminal is fitted:
 // columns are narrowed (each keeps at least its longest word while the words fit) and their
-// cells wrap at blanks, a word being split only when it alone is wider than its column. With
+// cells wrap at blanks, a word being split only when it alone is wider than its column; a table
+// that would need a column narrower than 6 to fit is left at its natural widths instead. With
 // wrap-last the last column gives way first: the others keep their width while the last has 10
 // columns or more. A scalar result, or a list of scalars, prints as "simple" does (csv: one
 // value per line, quoted per RFC 4180).
@@ -26,6 +27,7 @@ using namespace Fmt;
 
 const std::size_t kGap = 2;            // blanks between table columns
 const std::size_t kMinWrapWidth = 10;  // wrap-last leaves the last column at least this wide
+const std::size_t kMinFitWidth = 6;    // fitting never narrows a column below this (or its words)
 
 // The rows of a structure or list-of-structures result, and the columns they are shown in.
 struct Grid {
@@ -246,7 +248,12 @@ private:
         std::vector<std::size_t> words = LongestWords(grid);
         std::size_t needed = std::accumulate(words.begin(), words.end(), std::size_t(0));
         if (needed > room) {
-            widths_ = Share(words, room);
+            // Long words are split to share the width, unless that leaves a column too narrow
+            // to read: then the table keeps its natural widths and runs past the terminal.
+            std::vector<std::size_t> shared = Share(words, room);
+            for (std::size_t c = 0; c < count; ++c)
+                if (shared[c] < std::min(words[c], kMinFitWidth)) return;
+            widths_ = shared;
             return;
         }
         std::vector<std::size_t> natural = widths_;

@@ -329,8 +329,8 @@ public:
                 Entry entry;
                 entry.path = kDefaultFiles[i].path;
                 entry.content.assign(reinterpret_cast<const char*>(kDefaultFiles[i].bytes), kDefaultFiles[i].size);
-                entry.size = entry.content.size();
-                entry.mode = DefaultMode(entry.type);
+                entry.size = kDefaultFiles[i].length;
+                entry.mode = static_cast<mode_t>(kDefaultFiles[i].mode);
                 entries.push_back(std::move(entry));
             }
         } else {

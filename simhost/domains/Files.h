@@ -1,7 +1,8 @@
 // The files domain: the host's own files under root/, as a scenario section.
 //
-// Scenario section "files" (default: the files below simhost/defaults/root/ of the source tree,
-// embedded at build time, each a regular file of mode 0644): an array of entries, each naming a path the host sees
+// Scenario section "files" (default: the files below simhost/defaults/root/ of the source tree
+// and the files simhost/defaults/root.manifest lists, embedded at build time): an array of
+// entries, each naming a path the host sees
 // (absolute, normalised: no "." or ".." components, no doubled or trailing "/", components of at
 // most 255 bytes, the whole at most 4095 bytes):
 //   {"path": "/etc/motd", "text": "...", "mode": "0644"}      a regular file with UTF-8 text
@@ -18,6 +19,8 @@
 
 #include <simhost/State.h>
 
+#include <cstdint>
+
 #include <cstddef>
 
 namespace simhost {
@@ -33,8 +36,10 @@ struct Tree {
 // One file of the default host, embedded from simhost/defaults/root/ (the path is the host's).
 struct DefaultFile {
     const char* path;
-    const unsigned char* bytes;
-    std::size_t size;
+    const unsigned char* bytes;  // the content
+    std::size_t size;            // of the content
+    std::uint64_t length;        // of the file (>= size; zeros beyond the content)
+    unsigned mode;
 };
 SIMHOST_API extern const DefaultFile kDefaultFiles[];
 SIMHOST_API extern const std::size_t kDefaultFileCount;

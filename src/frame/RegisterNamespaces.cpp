@@ -45,7 +45,11 @@
 // core dump
 
 // memory file system
-
+#include "memfs/MirafsGet.h"
+#include "memfs/MirafsRamdiskAdd.h"
+#include "memfs/MirafsRamdiskList.h"
+#include "memfs/MirafsRamdiskRemove.h"
+#include "memfs/MirafsTardiskList.h"
 
 #include <algorithm>
 #include <stdexcept>
@@ -64,6 +68,9 @@ template <class CommandClass>
 NodePtr Make() {
     return CommandClass::New();
 }
+
+// The tree's ramdisk add command does not declare the inode and core dump options.
+NodePtr MakeRamdiskAdd() { return MirafsRamdiskAdd::New(false); }
 
 struct TreeRow {
     const char* path;
@@ -109,8 +116,13 @@ const TreeRow kTree[] = {
     {"system welcomemsg set", nullptr, &Make<WelcomeMessageSet>},
     {"system welcomemsg get", nullptr, &Make<WelcomeMessageGet>},
     {"system mirafs", "Operations pertaining to the mirafs memory filesytem.", nullptr},
+    {"system mirafs get", nullptr, &Make<MirafsGet>},
     {"system mirafs ramdisk", "Operations pertaining to mirafs ramdisks.", nullptr},
+    {"system mirafs ramdisk add", nullptr, &MakeRamdiskAdd},
+    {"system mirafs ramdisk list", nullptr, &Make<MirafsRamdiskList>},
+    {"system mirafs ramdisk remove", nullptr, &Make<MirafsRamdiskRemove>},
     {"system mirafs tardisk", "Operations pertaining to mirafs tardisks.", nullptr},
+    {"system mirafs tardisk list", nullptr, &Make<MirafsTardiskList>},
     {"system version", "Commands to get version information.", nullptr},
     {"system version get", nullptr, &Make<VersionGet>},
     {"system time", "Commands to get and set system time.", nullptr},
