@@ -52,45 +52,63 @@ public:
     }
 
 private:
-    // Column layouts are kept per structure name, so that the rows of a list share one.
-    Columns& ColumnsOf(const MetaStruct& row, const MetaStruct* tmpl) {
-        std::map<std::string, Columns>::iterator it = columns_.find(row.GetName());
-        if (it == columns_.end() || templates_[row.GetName()] != tmpl) {
-            Columns& columns = columns_[row.GetName()];
-            columns.ResetFor(params_.Fields(row.GetName()), tmpl, false);
-            templates_[row.GetName()] = tmpl;
-            return columns;
+    // What the parameters say about structures of one name, worked out once for all the rows of
+    // a list: the columns, the header, and each column's template and unit.
+    struct Layout {
+        Columns columns;
+        const MetaStruct* tmpl = nullptr;
+        bool header = true;
+        bool selected = false;  // fields:<Struct> names the fields: no others are shown
+        std::vector<const MetaObject*> fieldTemplates;
+        std::vector<const std::string*> units;
+    };
+
+    Layout& LayoutOf(const MetaStruct& row, const MetaStruct* tmpl) {
+        const std::string& name = row.GetName();
+        std::map<std::string, Layout>::iterator it = layouts_.find(name);
+        if (it != layouts_.end() && it->second.tmpl == tmpl) return it->second;
+        Layout& layout = layouts_[name];
+        std::vector<std::string> fields = params_.Fields(name);
+        layout.columns.ResetFor(fields, tmpl, false);
+        layout.tmpl = tmpl;
+        layout.header = params_.ShowHeader(name);
+        layout.selected = !fields.empty();
+        layout.fieldTemplates.clear();
+        layout.units.clear();
+        for (std::size_t c = 0; c < layout.columns.Count(); ++c) {
+            layout.fieldTemplates.push_back(FieldTemplate(tmpl, layout.columns.Name(c)));
+            layout.units.push_back(params_.Unit(name, layout.columns.Name(c)));
         }
-        return it->second;
+        return layout;
     }
 
     void Struct(const MetaStruct& row, const MetaStruct* tmpl, std::size_t indent) {
         const std::string& name = row.GetName();
-        if (params_.ShowHeader(name)) {
+        Layout& layout = LayoutOf(row, tmpl);
+        if (layout.header) {
             out_.PutRepeat(' ', indent);
             PutEscaped(out_, name);
             out_.Put(":\n", 2);
         }
-        bool selected = !params_.Fields(name).empty();
-        Columns& columns = ColumnsOf(row, tmpl);
-        columns.Map(row);
+        layout.columns.Map(row);
         // Copies: a nested structure of the same name maps the shared layout again.
-        std::vector<const MetaObject*> cells = columns.Cells();
-        std::vector<std::size_t> extras = columns.Extras();
+        std::vector<const MetaObject*> cells = layout.columns.Cells();
+        std::vector<std::size_t> extras = layout.columns.Extras();
         for (std::size_t c = 0; c < cells.size(); ++c) {
-            Field(name, columns.Name(c), cells[c], FieldTemplate(tmpl, columns.Name(c)),
+            Field(layout.columns.Name(c), cells[c], layout.fieldTemplates[c], layout.units[c],
                   indent + kIndentStep);
         }
-        if (selected) return;
+        if (layout.selected) return;
         const std::vector<MetaStruct::Field>& fields = row.GetFields();
         for (std::size_t e = 0; e < extras.size(); ++e) {
             const MetaStruct::Field& field = fields[extras[e]];
-            Field(name, field.first, field.second.get(), nullptr, indent + kIndentStep);
+            Field(field.first, field.second.get(), nullptr, params_.Unit(name, field.first),
+                  indent + kIndentStep);
         }
     }
 
-    void Field(const std::string& structName, const std::string& fieldName,
-               const MetaObject* value, const MetaObject* fieldTemplate, std::size_t indent) {
+    void Field(const std::string& fieldName, const MetaObject* value,
+               const MetaObject* fieldTemplate, const std::string* unit, std::size_t indent) {
         out_.PutRepeat(' ', indent);
         PutEscaped(out_, fieldName);
         out_.Put(':');
@@ -110,7 +128,6 @@ private:
         if (!scratch_.empty()) {
             out_.Put(' ');
             PutEscaped(out_, scratch_, false, escaped_);
-            const std::string* unit = params_.Unit(structName, fieldName);
             if (unit != nullptr && value->GetType() != MetaObj::MetaTypeList) {
                 out_.Put(' ');
                 PutEscaped(out_, *unit);
@@ -121,8 +138,7 @@ private:
 
     const FormatParams& params_;
     Writer& out_;
-    std::map<std::string, Columns> columns_;
-    std::map<std::string, const MetaStruct*> templates_;
+    std::map<std::string, Layout> layouts_;
     std::string scratch_;
     std::string escaped_;
 };
