@@ -3,6 +3,8 @@
 #include <simhost/Faults.h>
 #include <simhost/Trace.h>
 
+#include <sqlite3.h>
+
 namespace simhost {
 
 std::string Args::Text() const {
@@ -12,7 +14,28 @@ std::string Args::Text() const {
 
 Call::Call(Op operation, Args args)
     : operation_(operation), args_(std::move(args)), session_(Begin(operation_, args_)) {
+    BeginReading();
     RaiseFault();
+}
+
+Call::~Call() { EndReading(); }
+
+void Call::BeginReading() {
+    db().Cached("BEGIN")->Run();
+    reading_ = true;
+}
+
+void Call::EndReading() {
+    if (!reading_) return;
+    reading_ = false;
+    // A read transaction has nothing to lose: COMMIT only releases its snapshot (and a failure
+    // of its own, which cannot undo anything, is no failure of the call).
+    if (sqlite3_get_autocommit(db().Handle())) return;
+    try {
+        db().Cached("COMMIT")->Run();
+    } catch (const HostError&) {
+        sqlite3_exec(db().Handle(), "ROLLBACK", nullptr, nullptr, nullptr);
+    }
 }
 
 std::string Call::Root() const { return RootPath(StateDir()); }
@@ -35,6 +58,7 @@ void Call::RaiseFault() {
     }
     // Consume the fault in a write transaction, so that concurrent processes consume a counted
     // fault exactly once per remaining call.
+    EndReading();
     std::optional<Fault> fault;
     {
         WriteTxn txn(db());

@@ -5,9 +5,10 @@
 // journaled in one transaction and HostError carries its message and event. The Call then gives
 // the operation exclusive use of the host's connection until it is destroyed.
 //
-// Reads go through Read<T>() and Items<T>(); every change goes through Change() or Update<T>(),
-// which run it in one write transaction together with its journal entry, so a change and its
-// record commit or vanish together.
+// Reads go through Read<T>() and Items<T>(); they see one snapshot of the host until the call
+// makes its first change. Every change goes through Change() or Update<T>(), which run it in one
+// write transaction together with its journal entry, so a change and its record commit or
+// vanish together.
 //
 // Args are the operation's arguments as they are recorded (journal, trace); an argument added
 // with Secret() is recorded as "***" and its value never reaches the record.
@@ -48,6 +49,7 @@ private:
 class SIMHOST_API Call {
 public:
     explicit Call(Op operation, Args args = Args());
+    ~Call();
     Call(const Call&) = delete;
     Call& operator=(const Call&) = delete;
 
@@ -66,6 +68,7 @@ public:
     }
     template <class Fn>
     void Change(Fn&& change, const Args& journal_args) {
+        EndReading();
         WriteTxn txn(db());
         change(db());
         AppendJournal(db(), "change", OperationName(), journal_args.Text());
@@ -96,10 +99,15 @@ public:
 private:
     static Session Begin(Op operation, const Args& args);
     void RaiseFault();
+    // The call's reads, the fault check among them, share one read transaction from the call's
+    // start to its first change or its end: one snapshot, and the host's locks taken once.
+    void BeginReading();
+    void EndReading();
 
     Op operation_;
     Args args_;
     Session session_;
+    bool reading_ = false;
 };
 
 }  // namespace simhost
