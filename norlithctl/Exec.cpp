@@ -76,6 +76,8 @@ std::vector<char*> Pointers(std::vector<std::string>& texts) {
     if (out >= 0 && dup2(out, 1) < 0) _exit(kCannotRun);
     if (err >= 0 && dup2(err, 2) < 0) _exit(kCannotRun);
     syscall(SYS_close_range, 3U, ~0U, CLOSE_RANGE_CLOEXEC);
+    // A script is handed to its interpreter as /dev/fd/N: its descriptor must outlive the exec.
+    fcntl(program, F_SETFD, 0);
     syscall(SYS_execveat, program, "", argv, envp, AT_EMPTY_PATH);
     _exit(errno == ENOENT ? kNotFound : kCannotRun);
 }
@@ -114,9 +116,13 @@ void LogErrorLines(const std::string& program, const std::string& text) {
     }
 }
 
-[[noreturn]] void CannotStart() {
-    throw Ravel::Lib::RavelException(std::string("Cannot start a program on the host: ") +
-                                     std::strerror(errno));
+// The failure to create the program's process, with its event record (the program and the
+// reason), so that a caller reading the event form sees which program it was.
+[[noreturn]] void CannotStart(const std::string& program) {
+    const std::string reason = std::strerror(errno);
+    throw Ravel::Lib::RavelException("Cannot start a program on the host: " + reason,
+                                     Ravel::Lib::QuillMessage("quill.host.exec.cannotstart",
+                                                              {program, reason}));
 }
 
 }  // namespace
@@ -167,7 +173,7 @@ int NorlithCtl_Exec(const std::string& command, bool background, bool quiet, boo
             if (null >= 0) close(null);
             close(launch.program);
             errno = error;
-            CannotStart();
+            CannotStart(words[0]);
         }
     }
     int err = quiet ? (background ? null : pipe_fds[1]) : -1;
@@ -187,7 +193,7 @@ int NorlithCtl_Exec(const std::string& command, bool background, bool quiet, boo
     if (pid < 0) {
         if (pipe_fds[0] >= 0) close(pipe_fds[0]);
         errno = fork_error;
-        CannotStart();
+        CannotStart(words[0]);
     }
     std::string errors;
     if (pipe_fds[0] >= 0) {

@@ -63,7 +63,10 @@ public:
 
     int SetTimeOfDay(const struct timeval* tv, const struct timezone*) override {
         if (!tv) return 0;
-        if (tv->tv_usec < 0 || tv->tv_usec >= 1000000) {
+        // Seconds whose microseconds do not fit 64 bits are out of the host clock's range too.
+        const std::int64_t kMaxSeconds = INT64_MAX / 1000000 - 1;
+        if (tv->tv_usec < 0 || tv->tv_usec >= 1000000 || tv->tv_sec > kMaxSeconds ||
+            tv->tv_sec < -kMaxSeconds) {
             errno = EINVAL;
             return -1;
         }

@@ -3,8 +3,6 @@
 #include <simhost/Faults.h>
 #include <simhost/Trace.h>
 
-#include <sqlite3.h>
-
 namespace simhost {
 
 std::string Args::Text() const {
@@ -21,26 +19,15 @@ Call::Call(Op operation, Args args)
 Call::~Call() { EndReading(); }
 
 void Call::BeginReading() {
-    db().Cached("BEGIN")->Run();
+    db().BeginReading();
     reading_ = true;
 }
 
 void Call::EndReading() {
     if (!reading_) return;
     reading_ = false;
-    // A read transaction has nothing to lose: COMMIT only releases its snapshot (and a failure
-    // of its own, which cannot undo anything, is no failure of the call).
-    if (sqlite3_get_autocommit(db().Handle())) return;
-    try {
-        db().Cached("COMMIT")->Run();
-    } catch (const HostError&) {
-        sqlite3_exec(db().Handle(), "ROLLBACK", nullptr, nullptr, nullptr);
-    }
+    db().EndReading();
 }
-
-std::string Call::Root() const { return RootPath(StateDir()); }
-
-const char* Call::OperationName() const { return simhost::OperationName(operation_); }
 
 Session Call::Begin(Op operation, const Args& args) {
     if (trace::Enabled())

@@ -179,7 +179,31 @@ std::int64_t Db::LastInsertRowid() const { return sqlite3_last_insert_rowid(db_)
 
 int Db::Changes() const { return sqlite3_changes(db_); }
 
+void Db::BeginReading() {
+    if (readers_ > 0) {
+        ++readers_;
+        return;
+    }
+    if (!sqlite3_get_autocommit(db_)) return;  // inside a transaction of another kind
+    Cached("BEGIN")->Run();
+    readers_ = 1;
+}
+
+void Db::EndReading() {
+    if (readers_ == 0) return;
+    if (--readers_ == 0) StopReading();
+}
+
+void Db::StopReading() {
+    readers_ = 0;
+    if (sqlite3_get_autocommit(db_)) return;
+    // COMMIT only releases the snapshot: a failure of its own loses nothing.
+    if (sqlite3_exec(db_, "COMMIT", nullptr, nullptr, nullptr) != SQLITE_OK)
+        sqlite3_exec(db_, "ROLLBACK", nullptr, nullptr, nullptr);
+}
+
 WriteTxn::WriteTxn(Db& db) : db_(db) {
+    if (db_.readers_ > 0) db_.StopReading();
     db_.MakeWritable();
     db_.Exec("BEGIN IMMEDIATE");
 }
@@ -193,7 +217,10 @@ void WriteTxn::Commit() {
     open_ = false;
 }
 
-ReadTxn::ReadTxn(Db& db) : db_(db) { db_.Exec("BEGIN", "cannot read"); }
+ReadTxn::ReadTxn(Db& db) : db_(db) {
+    if (db_.readers_ > 0) db_.StopReading();
+    db_.Exec("BEGIN", "cannot read");
+}
 
 ReadTxn::~ReadTxn() { sqlite3_exec(db_.Handle(), "COMMIT", nullptr, nullptr, nullptr); }
 

@@ -102,6 +102,13 @@ public:
     // Rows changed by the last completed statement.
     int Changes() const;
 
+    // Host calls read in a shared read transaction: BeginReading opens it (when no transaction
+    // is open; calls nest), EndReading closes it when the outermost call ends. A WriteTxn (or a
+    // ReadTxn of its own) ends it first, whichever call opened it: a call's snapshot lasts until
+    // its first change.
+    void BeginReading();
+    void EndReading();
+
     bool ReadOnly() const { return mode_ == Mode::ReadOnly; }
     // Reopens a read-only connection read-write (nothing to do otherwise). Throws
     // std::logic_error when a Query or a transaction is alive.
@@ -125,6 +132,11 @@ private:
     bool no_follow_;
     std::string shown_as_;
     int live_queries_ = 0;
+    int readers_ = 0;  // calls inside the shared read transaction; 0 when none is open
+    // Ends the shared read transaction, if one is open (nothing in it can be lost).
+    void StopReading();
+    friend class WriteTxn;
+    friend class ReadTxn;
     std::unordered_map<std::string, std::unique_ptr<Stmt>> cache_;
 };
 

@@ -7,6 +7,10 @@
 #include <cstdlib>
 #include <filesystem>
 
+#include <cerrno>
+
+#include <fcntl.h>
+#include <sys/file.h>
 #include <unistd.h>
 
 namespace simhost {
@@ -36,8 +40,34 @@ void Host::Check() {
     CheckIntegrity(session.db());
 }
 
+namespace {
+
+// A shared lock on DIR/host.lock for as long as it lives: a host is created or replaced under
+// the exclusive one, so a reader holding it sees root/ whole, never one being switched or
+// removed. Without a lock file (no host was ever made there) it holds nothing.
+class ReaderLock {
+public:
+    explicit ReaderLock(const std::string& dir)
+        : fd_(open((dir + "/host.lock").c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW)) {
+        if (fd_ >= 0)
+            while (flock(fd_, LOCK_SH) != 0 && errno == EINTR) {
+            }
+    }
+    ~ReaderLock() {
+        if (fd_ >= 0) close(fd_);
+    }
+    ReaderLock(const ReaderLock&) = delete;
+    ReaderLock& operator=(const ReaderLock&) = delete;
+
+private:
+    int fd_;
+};
+
+}  // namespace
+
 std::string Host::Export() {
     Session session = Session::Open(dir_);
+    ReaderLock files(dir_);  // the database snapshot and root/ of one and the same host
     ReadTxn snapshot(session.db());
     Scenario scenario;
     for (const Domain* domain : Domains())

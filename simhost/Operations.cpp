@@ -14,11 +14,21 @@ const OperationInfo kOperations[] = {
 #include <simhost/Registry.def>
 };
 
-// The class part of a qualified name ("NorlithCtl::System::SystemInfoImpl"), or "" for the
-// event library's free functions.
+// The class part of a qualified name ("NorlithCtl::System::SystemInfoImpl"), the service of
+// an operation of the host management tool ("hostsvc" of "hostsvc/maintenance_mode_enter"), or
+// "" for the event library's free functions.
 std::string ClassOf(const std::string& name) {
     std::string::size_type colons = name.rfind("::");
-    return colons == std::string::npos ? "" : name.substr(0, colons);
+    if (colons != std::string::npos) return name.substr(0, colons);
+    std::string::size_type slash = name.find('/');
+    return slash == std::string::npos ? "" : name.substr(0, slash);
+}
+
+std::string SectionTitle(const std::string& owner) {
+    if (owner.empty()) return "Event library";
+    if (owner.find("::") == std::string::npos)
+        return "Host management tool (`/bin/kelp-cmd`), service `" + owner + "`";
+    return "`" + owner + "`";
 }
 
 }  // namespace
@@ -85,8 +95,7 @@ std::string OperationsMarkdown() {
         if (std::find(owners.begin(), owners.end(), owner) == owners.end()) owners.push_back(owner);
     }
     for (const std::string& owner : owners) {
-        text += "\n## " + (owner.empty() ? std::string("Event library") : "`" + owner + "`") +
-                "\n\n| operation | what it does |\n|---|---|\n";
+        text += "\n## " + SectionTitle(owner) + "\n\n| operation | what it does |\n|---|---|\n";
         for (const OperationInfo& info : kOperations)
             if (ClassOf(info.name) == owner)
                 text += std::string("| `") + info.name + "` | " + info.doc + " |\n";

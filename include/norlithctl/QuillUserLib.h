@@ -14,7 +14,10 @@ extern "C" {
 #endif
 
 NORLITHCTL_API int QuillUserLib_Init(void);
-// Formats like printf and posts the text as one entry.
+// Formats like printf and posts the text as one entry. A format that starts with
+// "@&!*@*@(ID)" posts an entry of event ID, formatted from the rest of the format; an id the log
+// refuses (more than 255 bytes, or characters other than letters, digits, '.', '_' and '-')
+// refuses the entry.
 NORLITHCTL_API int QuillUserLib_AddQuill(const char* format, ...)
     __attribute__((format(printf, 1, 2)));
 NORLITHCTL_API void QuillUserLib_Close(void);

@@ -37,6 +37,9 @@ public:
     virtual void SetWelcomeMessage(std::string message);
 
     // ---- maintenance mode
+    // The host's maintenance mode: 1 enabled, 2 disabled; any other value is a state the host
+    // cannot call either (3 entering, 4 exiting: a transition under way; 0 unknown).
+    virtual int GetMaintenanceModeState();
 
     // ---- keyboard layouts
 

@@ -340,12 +340,14 @@ void Program::AddLog(CLI::App& parent, const char* name, const char* description
             for (const observations::Entry& entry : host.ObservationLog(limit)) {
                 if (options->json)
                     std::cout << JsonText(nlohmann::ordered_json{{"time", entry.time},
+                                                                  {"event", entry.event},
                                                                   {"message", entry.message}})
                               << '\n';
                 else
-                    rows.push_back({entry.time, JsonText(entry.message)});
+                    rows.push_back({entry.time, entry.event.empty() ? "-" : entry.event,
+                                    JsonText(entry.message)});
             }
-            PrintTable({"TIME", "MESSAGE"}, rows);
+            PrintTable({"TIME", "EVENT", "MESSAGE"}, rows);
         }
     };
     command->add_option("--limit", options->limit, "Only the last N entries")->type_name("N");

@@ -1,5 +1,6 @@
 #include <simhost/domains/Files.h>
 
+#include <simhost/Image.h>
 #include <simhost/RootFs.h>
 
 #include <algorithm>
@@ -281,6 +282,14 @@ void Walk(int dirfd, const std::string& path, std::vector<Entry>& entries) {
         } else if (S_ISREG(info.st_mode)) {
             int fd = openat(dirfd, name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC);
             if (fd < 0) CannotRead(child, errno);
+            // The programs the build puts on every host are not the host's state (and are
+            // megabytes): told apart by their first bytes, never read whole.
+            char head[4] = {};
+            ssize_t got = pread(fd, head, sizeof head, 0);
+            if (image::IsImageFile(child, std::string(head, got > 0 ? static_cast<std::size_t>(got) : 0))) {
+                close(fd);
+                continue;
+            }
             try {
                 entry.content = FileContent(fd, info.st_size, child);
             } catch (...) {
@@ -311,6 +320,9 @@ public:
             throw HostError("Cannot open the host's files at '" + context.root +
                             "': " + std::strerror(fs.Error()));
         for (const Entry& entry : entries_) WriteEntry(fs, entry);
+        if (int error = image::InstallImage(fs))
+            throw HostError("Cannot install the host's programs under '" + context.root +
+                            "': " + std::strerror(error));
     }
 
 private:

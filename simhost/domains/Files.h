@@ -14,7 +14,9 @@
 // is not stored, so pre-allocated files stay sparse). Directories above an entry are created as
 // needed. An export lists every file and symbolic link, and the empty directories, sorted by
 // path, with text when the content is UTF-8 without NUL and base64 otherwise; a file's content
-// ends at its last nonzero byte and "size" gives the rest.
+// ends at its last nonzero byte and "size" gives the rest. The programs of the host's image
+// (Image.h) are installed with the section's files when a host is made, unless the section
+// gives their paths, and exports leave them out.
 #pragma once
 
 #include <simhost/State.h>

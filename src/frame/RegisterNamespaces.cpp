@@ -12,6 +12,9 @@
 #include "identity/BootDeviceGet.h"
 #include "identity/HostnameGet.h"
 #include "identity/HostnameSet.h"
+#include "identity/TimeGetSystem.h"
+#include "identity/TimeGetUptime.h"
+#include "identity/TimeSetSystem.h"
 #include "identity/UuidGet.h"
 #include "identity/VersionGet.h"
 #include "identity/WelcomeMessageGet.h"
@@ -30,6 +33,9 @@
 #include "snmp/SnmpAgentTest.h"
 
 // power and maintenance
+#include "power/MaintenanceModeGet.h"
+#include "power/MaintenanceModeSet.h"
+#include "power/Shutdown.h"
 
 // kernel settings
 #include "settings/SettingsAdvancedList.h"
@@ -126,8 +132,11 @@ const TreeRow kTree[] = {
     {"system version", "Commands to get version information.", nullptr},
     {"system version get", nullptr, &Make<VersionGet>},
     {"system time", "Commands to get and set system time.", nullptr},
+    {"system time get", nullptr, &Make<TimeGetSystem>},
+    {"system time set", nullptr, &Make<TimeSetSystem>},
     {"system stats", "Access to various system statistics", nullptr},
     {"system stats uptime", "System uptime, in microseconds", nullptr},
+    {"system stats uptime get", nullptr, &Make<TimeGetUptime>},
     {"system uuid", "Get the system UUID", nullptr},
     {"system uuid get", nullptr, &Make<UuidGet>},
     {"system hostname", "Operations pertaining the network name of the Quarn host.", nullptr},
@@ -139,7 +148,11 @@ const TreeRow kTree[] = {
     {"system snmp test", nullptr, &Make<SnmpAgentTest>},
     {"system snmp hash", nullptr, &Make<SnmpAgentHash>},
     {"system shutdown", "Command to shutdown the system.", nullptr},
+    {"system shutdown poweroff", nullptr, [] { return NodePtr(Shutdown::New(Shutdown::PowerOff)); }},
+    {"system shutdown reboot", nullptr, [] { return NodePtr(Shutdown::New(Shutdown::Reboot)); }},
     {"system maintenanceMode", "Command to manage the system's maintenance mode.", nullptr},
+    {"system maintenanceMode set", nullptr, &Make<MaintenanceModeSet>},
+    {"system maintenanceMode get", nullptr, &Make<MaintenanceModeGet>},
 };
 
 }  // namespace

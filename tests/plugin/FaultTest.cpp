@@ -22,6 +22,7 @@ using plugintest::Outcome;
 const char kEvent[] = "quill.host.operation.failed";
 
 plugintest::CommandPtr Make(const FaultCase& c) {
+    if (c.before) c.before();
     return c.make ? c.make() : plugintest::FindCommand(c.path);
 }
 

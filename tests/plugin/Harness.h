@@ -71,6 +71,8 @@ struct FaultCase {
         : name(std::move(case_name)), path(std::move(command_path)) {}
 
     FaultCase& Make(std::function<CommandPtr()> factory) { make = std::move(factory); return *this; }
+    // Runs before every execution (e.g. to reset process-wide state a command keeps).
+    FaultCase& Before(std::function<void()> reset) { before = std::move(reset); return *this; }
     FaultCase& Input(std::function<void(Kitbase::CallSpec::Input&)> fill) { input = std::move(fill); return *this; }
     FaultCase& Scenario(std::string text) { scenario = std::move(text); return *this; }
     FaultCase& Form(char message_form) { form = message_form; return *this; }
@@ -83,6 +85,7 @@ struct FaultCase {
     std::string name;                                      // unique, for test names
     std::string path;                                      // e.g. "system version get"
     std::function<CommandPtr()> make;                      // for a command the tree leaves out
+    std::function<void()> before;                          // may be empty
     std::function<void(Kitbase::CallSpec::Input&)> input;  // fills the input; may be empty
     std::string scenario;                                  // the host's scenario; "" default
     char form = 0;                                         // GetMessage argument the command uses

@@ -396,8 +396,8 @@ namespace {
 TEST_F(QuarnhostTest, ShowsTheHostsLogsOperationsAndEvents) {
     Init();
     EXPECT_EQ(Ok({"observations", "--limit", "1"}),
-              "TIME                      MESSAGE\n"
-              "2024-03-18T09:12:44.000Z  \"Host booted: Quarn 8.0.2 build 22380479\"\n");
+              "TIME                      EVENT              MESSAGE\n"
+              "2024-03-18T09:12:44.000Z  quill.host.booted  \"Host booted: Quarn 8.0.2 build 22380479\"\n");
     EXPECT_EQ(Ok({"syslog"}), "");  // an empty log prints nothing
     {
         testsupport::EnvOverride env("QUARN_HOST_STATE", state_);

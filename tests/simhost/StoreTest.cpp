@@ -289,6 +289,7 @@ TEST_F(StoreTest, AReplacementSwitchesRootWithTheDatabase) {
     EXPECT_FALSE(std::filesystem::exists(host.host().Root() + "/old"));
     EXPECT_FALSE(std::filesystem::exists(host.host().Root() + "/stale"));
     EXPECT_TRUE(std::filesystem::exists(host.host().Root() + std::string(simhost::files::kDefaultFiles[0].path)));
+    EXPECT_TRUE(std::filesystem::exists(host.host().Root() + "/bin/kelp-cmd"));  // the image
     EXPECT_FALSE(std::filesystem::exists(host.Dir() + "/root.new"));
     EXPECT_TRUE(simtest::Holds(host.host().Export(), testsupport::ReadFile(simtest::ScenarioFile("stateless.json"))));
 }
