@@ -5,6 +5,7 @@
 #include "cli/Cli.h"
 
 #include "cli/CommandRun.h"
+#include "cli/Complete.h"
 #include "cli/Console.h"
 #include "cli/GlobalOptions.h"
 #include "cli/Guard.h"
@@ -37,6 +38,7 @@ public:
           hostStateBefore_(HostStateBefore::Read()) {}
 
     int Run() {
+        if (!args_.empty() && args_[0] == kCompleteWord) return Complete();
         std::size_t next = 0;
         std::string error;
         if (!ParseLeading(args_, &next, &options_, &error)) return Usage(error);
@@ -64,6 +66,17 @@ public:
 
 private:
     static bool IsOptionWord(const std::string& word) { return !word.empty() && word[0] == '-'; }
+
+    // The shell asks what may be typed next (cli/Complete.h): candidates only, never an error.
+    int Complete() {
+        std::vector<std::string> words(args_.begin() + 1, args_.end());
+        for (const std::string& candidate : Completions(words, settings_.exeLink)) {
+            console_.Out().Put(candidate);
+            console_.Out().Put('\n');
+        }
+        console_.Finish(kExitOk);
+        return kExitOk;
+    }
 
     int Usage(const std::string& message) {
         console_.Error(message);
