@@ -114,7 +114,8 @@ protected:
         return rows;
     }
     json Module(const std::string& name) {
-        for (const json& m : json::parse(host_.host().Export())["modules"])
+        const json exported = json::parse(host_.host().Export());
+        for (const json& m : exported["modules"])
             if (m["name"] == name) return m;
         return json();
     }
