@@ -7,8 +7,10 @@
 
 #include <norlithctl/Export.h>
 
+#include <norlithctl/Module.h>
 #include <norlithctl/Testing.h>
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -55,6 +57,20 @@ public:
     virtual void LoadKeyboardMappings(const std::string& layout);
 
     // ---- modules and log levels
+
+    // Every kernel module the host knows, in the host's order, as NorlithCtl::System::ModuleImpl
+    // objects; the caller deletes every element.
+    virtual std::vector<Ravel::System::Module*> GetModules();
+    // The module of that name, or null when the host knows none by it; the caller deletes it.
+    virtual Ravel::System::Module* GetModuleByName(std::string name);
+    // The kernel core's log levels, in the host's order; the caller deletes every record
+    // (NorlithCtl::Util::DeleteVector).
+    virtual std::vector<Ravel::System::LogLevel*> GetAllLogLevels();
+    // Sets a kernel core log level until the next boot; refuses an unknown name or a level
+    // outside the host's range (0 to 31).
+    virtual void SetLogLevel(std::string name, std::uint32_t level);
+    // Returns a kernel core log level to its default.
+    virtual void SetDefaultLogLevel(std::string name);
 
     // ---- read cache
 

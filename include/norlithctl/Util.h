@@ -37,5 +37,13 @@ NORLITHCTL_API int NorlithCtl_Exec(const std::string& command, bool background, 
 NORLITHCTL_API void StringTokenize(const std::string& value, std::vector<std::string>& tokens,
                                    const std::string& separators);
 
+// Deletes every element of a vector of pointers the library handed out (log level records and
+// the like) and leaves the vector empty. Null elements are skipped. Nothing throws.
+template <class T>
+void DeleteVector(std::vector<T*>& objects) {
+    for (T* object : objects) delete object;
+    objects.clear();
+}
+
 }  // namespace Util
 }  // namespace NorlithCtl

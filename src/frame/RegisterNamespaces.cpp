@@ -47,6 +47,12 @@
 #include "settings/SettingsKeyboardLayoutSet.h"
 
 // kernel modules
+#include "module/ModuleGet.h"
+#include "module/ModuleList.h"
+#include "module/ModuleLoad.h"
+#include "module/ModuleParametersList.h"
+#include "module/ModuleParametersSet.h"
+#include "module/ModuleSet.h"
 
 // core dump
 
@@ -102,7 +108,13 @@ const TreeRow kTree[] = {
     {"system settings keyboard layout set", nullptr, &Make<SettingsKeyboardLayoutSet>},
     {"system settings keyboard layout list", nullptr, &Make<SettingsKeyboardLayoutList>},
     {"system module", "Operations that allow manipulation of the Norlith loadable modules and device drivers. Operations include load, list and setting options.", nullptr},
+    {"system module get", nullptr, &Make<ModuleGet>},
     {"system module parameters", "Operations that allow manipulation of parameters of Norlith loadable modules and device drivers. Operations include list and set options.", nullptr},
+    {"system module parameters list", nullptr, &Make<ModuleParametersList>},
+    {"system module parameters set", nullptr, &Make<ModuleParametersSet>},
+    {"system module list", nullptr, &Make<ModuleList>},
+    {"system module load", nullptr, &Make<ModuleLoad>},
+    {"system module set", nullptr, &Make<ModuleSet>},
     {"system coredump", "Operations pertaining to the Norlith Core dump configuration. ", nullptr},
     {"system coredump partition", "Operations pertaining to the Norlith Core dump configuration on Norlith Diagnostic partitions.", nullptr},
     {"system coredump network", "Operations pertaining to the Norlith Core dump configuration on network dump servers.", nullptr},
