@@ -199,7 +199,8 @@ TEST_F(PowerHostTest, EveryHostHasTheToolWhichExportsLeaveOut) {
     EXPECT_TRUE(std::equal(std::istreambuf_iterator<char>(a), {}, std::istreambuf_iterator<char>(b)));
 
     const std::string exported = host_.host().Export();
-    for (const json& file : json::parse(exported)["files"])
+    const json document = json::parse(exported);  // alive while its files are walked
+    for (const json& file : document["files"])
         EXPECT_NE(file["path"], "/bin/kelp-cmd") << "the image is not the host's state";
     {
         simhost::TempHost copy(exported);
