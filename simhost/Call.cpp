@@ -29,6 +29,10 @@ void Call::EndReading() {
     db().EndReading();
 }
 
+std::string Call::Root() const { return RootPath(StateDir()); }
+
+const char* Call::OperationName() const { return simhost::OperationName(operation_); }
+
 Session Call::Begin(Op operation, const Args& args) {
     if (trace::Enabled())
         trace::Record(simhost::OperationName(operation), trace::WithArguments() ? args.Text() : "");
