@@ -68,8 +68,7 @@ void KernelDumpRemoveFile::ExecuteInternal(const InputPtr& input, const OutputPt
         // Only a dump file of the host may go: unlink would remove any file it is given.
         if (target != active && target != configured && !IsKnownDumpFile(storage, target)) {
             output->SetError("Refusing to remove " + target +
-                             ": it is not a dump file of this host (neither a known, the active nor the "
-                             "configured dump file).");
+                             ": it is not one of this host's dump files (known, active or configured).");
             return;
         }
         if (target == active) {

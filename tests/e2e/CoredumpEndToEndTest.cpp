@@ -74,7 +74,7 @@ TEST_F(CoredumpEndToEnd, ADumpFileIsCreatedListedAndRemoved) {
 
     Result refused = Cli({"system", "coredump", "file", "remove", "--file", "/etc/tarsel/snmp.xml"});
     EXPECT_EQ(refused.status, 1);
-    EXPECT_NE(refused.err.find("it is not a dump file of this host"), std::string::npos) << refused.err;
+    EXPECT_NE(refused.err.find("it is not one of this host's dump files"), std::string::npos) << refused.err;
     EXPECT_EQ(stat((state_ + "/root/etc/tarsel/snmp.xml").c_str(), &info), 0);
 
     Result removed = Cli({"system", "coredump", "file", "remove", "-f", path});

@@ -239,8 +239,7 @@ TEST_F(FileCommands, RemoveRefusesAnyPathThatIsNotADumpFileOfTheHost) {
         plugintest::Run run = Do("remove", [&](Input& in) { in.SetString("file", path); in.SetFlag("force"); });
         EXPECT_EQ(Errors(run), (std::vector<std::string>{
                                    "Refusing to remove " + path +
-                                   ": it is not a dump file of this host (neither a known, the active nor the "
-                                   "configured dump file)."}));
+                                   ": it is not one of this host's dump files (known, active or configured)."}));
         for (const std::string& call : Calls()) EXPECT_EQ(call.find("Unlink"), std::string::npos);
     }
     EXPECT_TRUE(OnDisk("/etc/tarsel/snmp.xml"));
