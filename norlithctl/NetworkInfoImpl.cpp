@@ -5,6 +5,8 @@
 #include <simhost/NetDump.h>
 #include <simhost/domains/Coredump.h>
 
+#include "util/Text.h"
+
 #include <optional>
 
 namespace NorlithCtl {
@@ -63,7 +65,7 @@ void NetworkInfoImpl::SetNetDumperParams(const std::string& interfaceName,
             throw HostError("Interface " + interfaceName +
                             " is down: network dump needs an interface that is up");
         if (!address.IsValidAddress())
-            throw HostError("'" + address.GetStringAddress() + "' is not a valid IPv4 address");
+            throw HostError(quarn::util::Quote(address.GetStringAddress()) + " is not a valid IPv4 address");
         if (port < 1 || port > 65535)
             throw HostError("Port " + std::to_string(port) + " is not a port: expected 1 to 65535");
         call.Update<coredump::NetDump>([&](coredump::NetDump& state) {
@@ -85,9 +87,9 @@ void NetworkInfoImpl::RunNetDumperCheck(const std::string& interfaceName,
                                                              .Add("address", address.GetStringAddress())
                                                              .Add("port", port));
         std::optional<coredump::Interface> found = call.Items<coredump::Interface>().Find(interfaceName);
-        if (!found) return "Interface '" + interfaceName + "' is not a network interface of this host";
+        if (!found) return "Interface " + quarn::util::Quote(interfaceName) + " is not a network interface of this host";
         if (!found->up) return "Interface " + interfaceName + " is down: the dump server cannot be reached through it";
-        if (!address.IsValidAddress()) return "'" + address.GetStringAddress() + "' is not a valid IPv4 address";
+        if (!address.IsValidAddress()) return quarn::util::Quote(address.GetStringAddress()) + " is not a valid IPv4 address";
         if (port < 1 || port > 65535) return "Port " + std::to_string(port) + " is not a port: expected 1 to 65535";
         timeout_ms = static_cast<std::int64_t>(call.Read<coredump::NetDump>().check_timeout_seconds) * 1000;
         return "";

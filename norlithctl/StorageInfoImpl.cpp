@@ -6,6 +6,8 @@
 #include <simhost/domains/Coredump.h>
 #include <simhost/domains/KernelSettings.h>
 
+#include "util/Text.h"
+
 #include <memory>
 #include <optional>
 
@@ -72,7 +74,7 @@ std::optional<coredump::PartitionView> Configured(const coredump::Partitions& st
 coredump::PartitionView Diagnostic(const coredump::Partitions& state, const std::string& name) {
     std::optional<coredump::PartitionView> view = coredump::FindPartition(state, name);
     if (!view) {
-        std::string text = "Unknown partition '" + name + "'";
+        std::string text = "Unknown partition " + quarn::util::Quote(name);
         std::vector<coredump::PartitionView> diagnostic = coredump::DiagnosticPartitions(state);
         if (diagnostic.empty()) throw HostError(text + "; this host has no diagnostic partitions");
         text += "; the diagnostic partitions of this host are:";
@@ -317,7 +319,7 @@ void StorageInfoImpl::SetDiagnosticFile(const std::string& path, bool activate) 
     norlithctl::HostCall([&] {
         Call call(Op::StorageInfoImpl_SetDiagnosticFile, Args().Add("path", path).Add("activate", activate));
         if (!simhost::IsHostPath(path) || !coredump::IsNormalHostPath(path))
-            throw HostError("Dump file path '" + path + "' is not a normalised absolute host path");
+            throw HostError("Dump file path " + quarn::util::Quote(path) + " is not a normalised absolute host path");
         RequireValid(call, path);
         call.Update<coredump::Files>([&](coredump::Files& s) {
             s.configured = path;

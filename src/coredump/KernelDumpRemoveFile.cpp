@@ -65,20 +65,23 @@ void KernelDumpRemoveFile::ExecuteInternal(const InputPtr& input, const OutputPt
         } else {
             target = configured;
         }
+        // An absent ("") active or configured file is no file to match.
+        const bool isActive = !active.empty() && target == active;
+        const bool isConfigured = !configured.empty() && target == configured;
         // Only a dump file of the host may go: unlink would remove any file it is given.
-        if (target != active && target != configured && !IsKnownDumpFile(storage, target)) {
+        if (!isActive && !isConfigured && !IsKnownDumpFile(storage, target)) {
             output->SetError("Refusing to remove " + target +
                              ": it is not one of this host's dump files (known, active or configured).");
             return;
         }
-        if (target == active) {
+        if (isActive) {
             if (!force) {
                 output->SetError("Dump file " + target + " currently active, --force is required.");
                 return;
             }
             storage.DeactivateDiagnosticFile();
         }
-        if (target == configured) storage.UnconfigureDiagnosticFile();
+        if (isConfigured) storage.UnconfigureDiagnosticFile();
         if (NorlithCtl::Os::Env::Default()->Unlink(target.c_str()) != 0) {
             const int error = errno;
             output->SetError("Unlink of file " + target + " failed: " + std::strerror(error));

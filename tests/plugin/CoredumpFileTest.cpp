@@ -247,6 +247,14 @@ TEST_F(FileCommands, RemoveRefusesAnyPathThatIsNotADumpFileOfTheHost) {
     EXPECT_EQ(host_->host().Export(), before);
 }
 
+TEST_F(FileCommands, AnEmptyPathIsNoDumpFileEvenWithoutAnActiveOne) {
+    Use(Scenario("", kB));
+    plugintest::Run run = Do("remove", [](Input& in) { in.SetString("file", ""); in.SetFlag("force"); });
+    EXPECT_EQ(Errors(run), (std::vector<std::string>{
+                               "Refusing to remove : it is not one of this host's dump files (known, active or configured)."}));
+    EXPECT_EQ(State()["configured"], kB);
+}
+
 TEST_F(FileCommands, AKnownFileThatVanishedGetsTheUnlinkMessage) {
     plugintest::Run run = Do("remove", [](Input& in) { in.SetString("file", kGone); });
     EXPECT_EQ(Errors(run), (std::vector<std::string>{"Unlink of file " + kGone + " failed: No such file or directory"}));
