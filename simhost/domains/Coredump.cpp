@@ -12,6 +12,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <unordered_map>
 #include <unordered_set>
 
 namespace simhost {
@@ -218,11 +219,11 @@ Files Files::Default() {
 }
 
 std::string Files::Check() const {
-    std::unordered_set<std::string> names;
+    std::unordered_map<std::string, const Datastore*> names;
     for (std::size_t i = 0; i < datastores.size(); ++i) {
         const Datastore& datastore = datastores[i];
         const std::string at = "datastores[" + std::to_string(i) + "]";
-        if (!names.insert(datastore.name).second) return at + ": '" + datastore.name + "' appears twice";
+        if (!names.emplace(datastore.name, &datastore).second) return at + ": '" + datastore.name + "' appears twice";
         if (datastore.free_mb > datastore.capacity_mb) return at + ".free_mb: exceeds capacity_mb";
     }
     std::unordered_set<std::string> paths;
@@ -231,7 +232,8 @@ std::string Files::Check() const {
         const DumpFile& file = files[i];
         const std::string at = "files[" + std::to_string(i) + "]";
         if (!paths.insert(file.path).second) return at + ": '" + file.path + "' appears twice";
-        const Datastore* datastore = FindDatastore(*this, file.datastore);
+        auto found = names.find(file.datastore);
+        const Datastore* datastore = found == names.end() ? nullptr : found->second;
         if (!datastore) return at + ".datastore: '" + file.datastore + "' is not a datastore of the host";
         if (file.path.compare(0, datastore->mount.size() + 1, datastore->mount + "/") != 0)
             return at + ".path: not below the mount of datastore '" + datastore->name + "'";
