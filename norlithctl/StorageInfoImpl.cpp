@@ -122,7 +122,7 @@ StorageInfoImpl::~StorageInfoImpl() {}
 Ravel::Storage::DiagnosticPartition* StorageInfoImpl::GetActiveDiagnosticPartition() {
     return Hand(norlithctl::HostCall([] {
         Call call(Op::StorageInfoImpl_GetActiveDiagnosticPartition);
-        coredump::Partitions state = call.Read<coredump::Partitions>();
+        coredump::Partitions state = coredump::LoadForLookUp(call.db());
         return state.active.empty() ? std::nullopt : coredump::FindPartition(state, state.active);
     }));
 }
@@ -130,7 +130,7 @@ Ravel::Storage::DiagnosticPartition* StorageInfoImpl::GetActiveDiagnosticPartiti
 Ravel::Storage::DiagnosticPartition* StorageInfoImpl::GetConfiguredDiagnosticPartition() {
     return Hand(norlithctl::HostCall([] {
         Call call(Op::StorageInfoImpl_GetConfiguredDiagnosticPartition);
-        return Configured(call.Read<coredump::Partitions>());
+        return Configured(coredump::LoadForLookUp(call.db()));
     }));
 }
 

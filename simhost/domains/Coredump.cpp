@@ -122,6 +122,43 @@ std::string Partitions::Check() const {
     return "";
 }
 
+Partitions LoadForLookUp(Db& db) {
+    std::optional<std::string> text = store::LoadState(db, Partitions::kSection);
+    if (!text) return Load<Partitions>(db);  // reports the missing state
+    typedef nlohmann::json::parse_event_t Event;
+    std::string key;
+    std::vector<std::string> disks;  // of the active and the configured name, read before "disks"
+    bool names_read = false;         // a state stored in another order keeps every disk
+    Partitions state;
+    try {
+        nlohmann::json kept = nlohmann::json::parse(*text, [&](int depth, Event event, nlohmann::json& parsed) {
+            if (depth == 1 && event == Event::key) key = parsed.get<std::string>();
+            if (depth == 1 && event == Event::value && (key == "active" || key == "configured") &&
+                parsed.is_string()) {
+                const std::string& name = parsed.get_ref<const std::string&>();
+                const std::string::size_type colon = name.rfind(':');
+                if (colon != std::string::npos) disks.push_back(name.substr(0, colon));
+                if (key == "configured") names_read = true;
+            }
+            // A disk (an object of the disks array) is kept only when one of the names is on it.
+            if (depth == 2 && event == Event::object_end) {
+                auto found = parsed.find("name");
+                if (!names_read || found == parsed.end() || !found->is_string()) return true;
+                for (const std::string& disk : disks)
+                    if (found->get_ref<const std::string&>() == disk) return true;
+                return false;
+            }
+            return true;
+        });
+        Codec<Partitions>::Read(kept, Location(), state);
+    } catch (const std::exception& error) {
+        throw HostError(std::string("The simulated host's state is damaged: the dump_partitions state cannot "
+                                    "be read (") + error.what() + "); recreate the host with 'quarnhost init --force'",
+                        HostError::Code::kDamaged);
+    }
+    return state;
+}
+
 std::optional<PartitionView> FindPartition(const Partitions& state, const std::string& name) {
     const std::string::size_type colon = name.rfind(':');
     if (colon == std::string::npos) return std::nullopt;

@@ -3,10 +3,10 @@
 //
 // Scenario section "dump_partitions" (default: two disks, each with a diagnostic partition; the
 // first one active and configured):
-//   {"disks": [{"name": device name (1..100 characters A-Z a-z 0-9 . _ -), "local": bool,
+//   {"active": "" or the name of a diagnostic partition, "configured": "" or a partition name,
+//    "disks": [{"name": device name (1..100 characters A-Z a-z 0-9 . _ -), "local": bool,
 //               "partitions": [{"number": 1..128, "type": "diagnostic" | "qrfs" | "boot" |
-//                               "scratch" | "other", "size_mb": 1..16777216}]}],
-//    "active": "" or the name of a diagnostic partition, "configured": "" or a partition name}
+//                               "scratch" | "other", "size_mb": 1..16777216}]}]}
 // A partition's name is its disk's name, ":" and its number ("nvd.5000c5009a1e2f70:2"); its path
 // is "/dev/disks/" followed by the name. "configured" may name a partition the host no longer has
 // (a disk was pulled): the host then reports that it cannot find the configured partition. At a
@@ -92,9 +92,10 @@ struct Partitions {
 
 template <class V>
 void Describe(V& v, Partitions& s) {
-    v("disks", s.disks, MaxItems(100000));
+    // The names come first, so that a look-up of one partition knows its disk before the disks.
     v("active", s.active, Text(256));
     v("configured", s.configured, Text(256));
+    v("disks", s.disks, MaxItems(100000));
 }
 
 // One partition as the library shows it.
@@ -107,6 +108,10 @@ struct PartitionView {
 };
 
 SIMHOST_API std::string PartitionName(const Disk& disk, const Partition& partition);
+// The stored state with, of its disks, only those that the active and the configured partition
+// are on: a look-up of either reads past the other disks without building them (a host may have
+// 100,000 partitions). Throws HostError (kDamaged) when the state cannot be read.
+SIMHOST_API Partitions LoadForLookUp(Db& db);
 // The partition of that name, any type.
 SIMHOST_API std::optional<PartitionView> FindPartition(const Partitions& state, const std::string& name);
 // Every diagnostic partition, in disk order and partition order within a disk.
