@@ -1,5 +1,7 @@
 #include <simhost/Kernel.h>
 
+#include <simhost/domains/Coredump.h>
+
 #include <simhost/RootFs.h>
 #include <simhost/Time.h>
 #include <simhost/domains/Clock.h>
@@ -124,7 +126,8 @@ int Unlink(Call& call, const std::string& path) {
     if (int error = fs.Stat(path, &info)) return error;
     if (S_ISDIR(info.st_mode)) return EISDIR;
     if (int error = fs.Unlink(path)) return error;
-    call.Change([](Db&) {});
+    // A dump file's space goes back to its datastore, and the host forgets the file.
+    call.Change([&](Db& db) { coredump::FileRemoved(db, path); });
     return 0;
 }
 

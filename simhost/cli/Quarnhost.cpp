@@ -2,13 +2,17 @@
 
 #include <simhost/Events.h>
 #include <simhost/Host.h>
+#include <simhost/NetDump.h>
 #include <simhost/Store.h>
 #include <simhost/cli/Input.h>
+#include <simhost/domains/Coredump.h>
 
 #include <CLI/CLI.hpp>
 #include <nlohmann/json.hpp>
 
 #include <algorithm>
+#include <atomic>
+#include <csignal>
 #include <cerrno>
 #include <cstring>
 #include <functional>
@@ -118,6 +122,7 @@ private:
     void AddJournal(CLI::App& parent);
     void AddLog(CLI::App& parent, const char* name, const char* description);
     void AddOperations(CLI::App& parent);
+    void AddNetdumpServer(CLI::App& parent);
 
     Host OpenHost() const;
     // OpenHost, after verifying the whole database file.
@@ -159,6 +164,7 @@ void Program::Register() {
     AddLog(app_, "syslog", "Print the host's system log");
     AddLog(app_, "observations", "Print the host's observation log");
     AddOperations(app_);
+    AddNetdumpServer(app_);
 }
 
 void Program::AddInit(CLI::App& parent) {
@@ -373,6 +379,40 @@ void Program::AddOperations(CLI::App& parent) {
         PrintTable({"EVENT", "TEXT"}, rows);
     };
     command->add_flag("--markdown", *markdown, "Print the page docs/operations.md is");
+}
+
+namespace {
+std::atomic<bool> g_stop_serving{false};
+void StopServing(int) { g_stop_serving = true; }
+}  // namespace
+
+void Program::AddNetdumpServer(CLI::App& parent) {
+    struct Options {
+        std::string listen, seconds = "600";
+    };
+    auto options = std::make_shared<Options>();
+    CLI::App* command = parent.add_subcommand(
+        "netdump-server", "Answer the network dump server probes of 'system coredump network check'");
+    command->add_option("--listen", options->listen, "The IPv4 address and UDP port to answer on (port 0: a free one)")
+        ->type_name("ADDRESS:PORT");
+    command->add_option("--seconds", options->seconds, "Stop after this many seconds (default 600)")
+        ->type_name("N");
+    actions_[command] = [options] {
+        const std::string& listen = options->listen;
+        const std::string::size_type colon = listen.rfind(':');
+        if (listen.empty() || colon == std::string::npos)
+            Usage("--listen needs ADDRESS:PORT, e.g. 127.0.0.1:6500");
+        const std::string address = listen.substr(0, colon);
+        if (!coredump::IsIpv4(address)) Usage("--listen: '" + address + "' is not a dotted IPv4 address");
+        const int port = static_cast<int>(WholeNumber("--listen port", listen.substr(colon + 1), 0, 65535));
+        const std::int64_t seconds = WholeNumber("--seconds", options->seconds, 1, 86400);
+        netdump::Server server(address, port);
+        std::signal(SIGTERM, StopServing);
+        std::signal(SIGINT, StopServing);
+        std::cout << "Answering network dump probes on " << address << ":" << server.Port() << std::endl;
+        std::size_t answered = server.Serve(static_cast<double>(seconds), &g_stop_serving);
+        std::cout << "Answered " << answered << (answered == 1 ? " probe" : " probes") << std::endl;
+    };
 }
 
 Host Program::OpenHost() const {

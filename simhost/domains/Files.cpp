@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <cstring>
 #include <optional>
+#include <unordered_map>
 
 #include <dirent.h>
 #include <fcntl.h>
@@ -347,17 +348,27 @@ public:
             }
         } else {
             if (!value->is_array()) at.Fail("expected an array");
+            // Linear in the entries (a generated host may hold 100,000 files): every path seen, and
+            // for every directory above a path seen, the first path below it.
+            std::unordered_map<std::string, std::string> types;
+            std::unordered_map<std::string, std::string> first_below;
             for (std::size_t i = 0; i < value->size(); ++i) {
                 Entry entry = ParseEntry((*value)[i], at.Index(i));
-                for (const Entry& earlier : entries) {
-                    if (earlier.path == entry.path)
-                        at.Index(i).Member("path").Fail("'" + entry.path + "' appears twice");
-                    const Entry& outer = earlier.path.size() < entry.path.size() ? earlier : entry;
-                    const Entry& inner = &outer == &earlier ? entry : earlier;
-                    if (outer.type != "directory" && inner.path.compare(0, outer.path.size() + 1, outer.path + "/") == 0)
-                        at.Index(i).Member("path").Fail("'" + inner.path + "' lies under '" +
-                                                        outer.path + "', which is not a directory");
+                const Location where = at.Index(i).Member("path");
+                if (types.count(entry.path)) where.Fail("'" + entry.path + "' appears twice");
+                for (std::size_t slash = entry.path.find('/', 1); slash != std::string::npos;
+                     slash = entry.path.find('/', slash + 1)) {
+                    auto above = types.find(entry.path.substr(0, slash));
+                    if (above != types.end() && above->second != "directory")
+                        where.Fail("'" + entry.path + "' lies under '" + above->first + "', which is not a directory");
                 }
+                auto below = first_below.find(entry.path);
+                if (entry.type != "directory" && below != first_below.end())
+                    where.Fail("'" + below->second + "' lies under '" + entry.path + "', which is not a directory");
+                for (std::size_t slash = entry.path.find('/', 1); slash != std::string::npos;
+                     slash = entry.path.find('/', slash + 1))
+                    first_below.emplace(entry.path.substr(0, slash), entry.path);
+                types.emplace(entry.path, entry.type);
                 entries.push_back(std::move(entry));
             }
         }

@@ -55,6 +55,17 @@
 #include "module/ModuleSet.h"
 
 // core dump
+#include "coredump/KernelDumpAddFile.h"
+#include "coredump/KernelDumpCheckNetwork.h"
+#include "coredump/KernelDumpGetFile.h"
+#include "coredump/KernelDumpGetNetwork.h"
+#include "coredump/KernelDumpGetPartition.h"
+#include "coredump/KernelDumpListFiles.h"
+#include "coredump/KernelDumpListPartitions.h"
+#include "coredump/KernelDumpRemoveFile.h"
+#include "coredump/KernelDumpSetFile.h"
+#include "coredump/KernelDumpSetNetwork.h"
+#include "coredump/KernelDumpSetPartition.h"
 
 // memory file system
 #include "memfs/MirafsGet.h"
@@ -117,8 +128,19 @@ const TreeRow kTree[] = {
     {"system module set", nullptr, &Make<ModuleSet>},
     {"system coredump", "Operations pertaining to the Norlith Core dump configuration. ", nullptr},
     {"system coredump partition", "Operations pertaining to the Norlith Core dump configuration on Norlith Diagnostic partitions.", nullptr},
+    {"system coredump partition get", nullptr, &Make<KernelDumpGetPartition>},
+    {"system coredump partition list", nullptr, &Make<KernelDumpListPartitions>},
+    {"system coredump partition set", nullptr, &Make<KernelDumpSetPartition>},
     {"system coredump network", "Operations pertaining to the Norlith Core dump configuration on network dump servers.", nullptr},
+    {"system coredump network set", nullptr, &Make<KernelDumpSetNetwork>},
+    {"system coredump network get", nullptr, &Make<KernelDumpGetNetwork>},
+    {"system coredump network check", nullptr, &Make<KernelDumpCheckNetwork>},
     {"system coredump file", "Operations pertaining to the Norlith Core dump configuration on QRFS Files.", nullptr},
+    {"system coredump file get", nullptr, &Make<KernelDumpGetFile>},
+    {"system coredump file set", nullptr, &Make<KernelDumpSetFile>},
+    {"system coredump file add", nullptr, &Make<KernelDumpAddFile>},
+    {"system coredump file remove", nullptr, &Make<KernelDumpRemoveFile>},
+    {"system coredump file list", nullptr, &Make<KernelDumpListFiles>},
     {"system secpolicy", "Options related to Norlith access control subsystem. These options are typically in place for specific workarounds or debugging. These commands should be used at the direction of Tarsel Support Engineers.", nullptr},
     {"system secpolicy domain", "Options related to Norlith access control security domains.", nullptr},
     {"system secpolicy domain list", nullptr, &Make<SecpolicyDomainList>},

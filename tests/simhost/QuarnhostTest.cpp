@@ -263,7 +263,7 @@ TEST_F(QuarnhostTest, JournalPrintsAlignedRowsJsonLinesAndClears) {
 }
 
 TEST_F(QuarnhostTest, UsageErrorsExitWithTwoNamingTheProblem) {
-    ExpectRefusal({}, 2, "missing command (init, export, fault, journal, syslog, observations or operations)");
+    ExpectRefusal({}, 2, "missing command (init, export, fault, journal, syslog, observations, operations or netdump-server)");
     ExpectRefusal({"reboot"}, 2, "unknown command 'reboot'");
     ExpectRefusal({"--verbose", "export"}, 2, "unknown option '--verbose'");
     ExpectRefusal({"export", "--all"}, 2, "unknown option '--all' for export (see 'quarnhost export --help')");

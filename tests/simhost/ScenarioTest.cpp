@@ -186,6 +186,10 @@ TEST(ScenarioValidation, ReportsTheFirstProblemWithItsLocation) {
         {files({{{"path", "/x"}, {"mode", "0888"}}}), "scenario: files[0].mode: expected an octal mode"},
         {files({{{"path", "/x"}, {"text", ""}}, {{"path", "/x/y"}, {"text", ""}}}),
          "scenario: files[1].path: '/x/y' lies under '/x', which is not a directory"},
+        {files({{{"path", "/x/y/z"}, {"text", ""}}, {{"path", "/x"}, {"text", ""}}}),
+         "scenario: files[1].path: '/x/y/z' lies under '/x', which is not a directory"},
+        {files({{{"path", "/x/y"}, {"type", "directory"}}, {{"path", "/x/y"}, {"text", ""}}}),
+         "scenario: files[1].path: '/x/y' appears twice"},
         {EditedDefault("/faults", nlohmann::json::array({{{"operation", "GetSystemUuid"},
                                                           {"message", "m"}}})),
          "scenario: faults[0].operation: unknown operation 'GetSystemUuid' (nearest: "
