@@ -46,7 +46,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         start = end + 1;
     }
     std::string error;
-    for (const MetaObject* shape : {Template().get(), static_cast<const MetaObject*>(nullptr)}) {
+    const MetaObject* shapes[] = {Template().get(), nullptr};  // with a template, and without
+    for (const MetaObject* shape : shapes) {
         error.clear();
         if (Kitbase::Engine::CheckFormatParams(settings, shape, &error)) {
             if (!error.empty()) std::abort();
