@@ -55,6 +55,10 @@ function(quarn_add_module target)
   # No default libraries (the C++ runtime among them): only the C library and the unwinder.
   target_link_options(${target} PRIVATE -nodefaultlibs)
   target_link_libraries(${target} PRIVATE Boost::boost c gcc_s)
+  # Packed relative relocations: fewer for the loader to read each time the module is loaded.
+  if(QUARN_LINKER_HAS_RELR)
+    target_link_options(${target} PRIVATE "LINKER:-z,pack-relative-relocs")
+  endif()
   set_target_properties(${target} PROPERTIES
     PREFIX "lib"
     CXX_VISIBILITY_PRESET hidden

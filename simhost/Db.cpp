@@ -2,6 +2,8 @@
 
 #include <sqlite3.h>
 
+#include <sys/stat.h>
+
 #include <mutex>
 #include <stdexcept>
 
@@ -96,6 +98,23 @@ Db::Db(const std::string& path, Mode mode, bool no_follow, std::string shown_as)
 Db::~Db() {
     cache_.clear();  // statements are finalized before their connection closes
     sqlite3_close_v2(db_);
+    if (mode_ == Mode::ReadOnly) EmptyWal();
+}
+
+void Db::EmptyWal() const noexcept {
+    struct stat info {};
+    if (lstat((path_ + "-wal").c_str(), &info) != 0 || info.st_size == 0) return;
+    // Best effort: another connection still reading, or a host this user cannot write, leaves
+    // the WAL for a later writer to empty.
+    sqlite3* db = nullptr;
+    int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | (no_follow_ ? SQLITE_OPEN_NOFOLLOW : 0);
+    if (sqlite3_open_v2(path_.c_str(), &db, flags, nullptr) == SQLITE_OK) {
+        int persist = 1;
+        sqlite3_file_control(db, "main", SQLITE_FCNTL_PERSIST_WAL, &persist);
+        sqlite3_exec(db, "PRAGMA journal_size_limit=0; PRAGMA wal_checkpoint(TRUNCATE)", nullptr,
+                     nullptr, nullptr);
+    }
+    sqlite3_close_v2(db);
 }
 
 void Db::Open() {
@@ -118,10 +137,14 @@ void Db::Open() {
     int persist = 1;
     sqlite3_file_control(db_, "main", SQLITE_FCNTL_PERSIST_WAL, &persist);
     try {
-        // WAL with NORMAL keeps every committed transaction across a killed process.
+        // WAL with NORMAL keeps every committed transaction across a killed process. The last
+        // writer to close checkpoints the WAL and, with a size limit of 0, empties it: a WAL left
+        // with content would be read and checksummed again by every later process that opens
+        // the host first (about a millisecond for a freshly created host's).
         Exec(mode_ == Mode::ReadOnly
                  ? std::string(kConnectionSettings)
-                 : std::string(kConnectionSettings) + ";PRAGMA synchronous=NORMAL",
+                 : std::string(kConnectionSettings) +
+                       ";PRAGMA synchronous=NORMAL;PRAGMA journal_size_limit=0",
              "cannot open");
     } catch (...) {
         sqlite3_close_v2(db_);

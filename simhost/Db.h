@@ -135,6 +135,10 @@ private:
     int readers_ = 0;  // calls inside the shared read transaction; 0 when none is open
     // Ends the shared read transaction, if one is open (nothing in it can be lost).
     void StopReading();
+    // A writer that closed while this read-only connection was open (a tool the command ran,
+    // say) could not empty the WAL, and every later process would read it again when it first
+    // opens the host: the last connection to close empties it.
+    void EmptyWal() const noexcept;
     friend class WriteTxn;
     friend class ReadTxn;
     std::unordered_map<std::string, std::unique_ptr<Stmt>> cache_;

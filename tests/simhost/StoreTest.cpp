@@ -152,6 +152,30 @@ TEST_F(StoreTest, CorruptOrForeignDatabasesAreRefusedAndLeftAlone) {
     simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::ReadOnly);
     EXPECT_EQ(foreign.QueryInt("SELECT count(*) FROM accounts"), 1);
 }
+// A process whose tool wrote to the host while it read (maintenance mode's kelp-cmd) closes last:
+// it empties the WAL, so later processes do not read the tool's changes from it again.
+TEST_F(StoreTest, TheLastConnectionToCloseLeavesTheWalEmpty) {
+    TempDir dir;
+    simhost::Host host(dir / "h");
+    host.Init();
+    const std::string path = simhost::DatabasePath(host.Dir());
+    auto walBytes = [&] {
+        struct stat info {};
+        return stat((path + "-wal").c_str(), &info) == 0 ? info.st_size : 0;  // absent: empty
+    };
+    EXPECT_EQ(walBytes(), 0) << "creating the host leaves no WAL behind";
+    {
+        simhost::Db reader(path, simhost::Db::Mode::ReadOnly);
+        reader.Exec("SELECT count(*) FROM items");
+        {
+            simhost::Db writer(path, simhost::Db::Mode::ReadWrite);
+            writer.Exec("CREATE TABLE scratch(x); INSERT INTO scratch VALUES (1); DROP TABLE scratch;");
+        }
+        EXPECT_GT(walBytes(), 0) << "the writer could not empty it while another connection was open";
+    }
+    EXPECT_EQ(walBytes(), 0);
+    EXPECT_TRUE(simtest::Holds(host.Export(), simhost::DefaultScenario()));
+}
 
 TEST_F(StoreTest, OtherSchemaVersionIsRefusedUntilReplaced) {
     TempDir dir;
