@@ -4,6 +4,7 @@
 // process on a free loopback port: verified while it runs, port unreachable once it is gone.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -23,26 +24,15 @@ namespace {
 using nlohmann::json;
 using Result = testsupport::ProcessResult;
 
-class CoredumpEndToEnd : public ::testing::Test {
+class CoredumpEndToEnd : public e2e::HostFixture {
 protected:
     void SetUp() override { ASSERT_EQ(Host({"init"}).status, 0); }
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return testsupport::RunProgram(QUARNCLI, args);
-    }
     json Json(std::vector<std::string> args) {
         args.insert(args.begin(), {"--formatter", "json"});
         Result result = Cli(args);
         EXPECT_EQ(result.status, 0) << result.err;
         return json::parse(result.out);
     }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return testsupport::RunProgram(QUARNHOST, args);
-    }
-
-    testsupport::TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(CoredumpEndToEnd, PartitionsAreListedAndConfigured) {

@@ -2,6 +2,7 @@
 // simulated host, faults set with quarnhost, and the refusals a user meets.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -21,25 +22,10 @@ using testsupport::RunProgram;
 using testsupport::TempDir;
 using testsupport::WriteFile;
 
-class EndToEnd : public ::testing::Test {
+class EndToEnd : public e2e::HostFixture {
 protected:
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return RunProgram(QUARNCLI, args);
-    }
-    Result Json(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--formatter", "json"});
-        return Cli(args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return RunProgram(QUARNHOST, args);
-    }
     // The host's identity as quarnhost exports it (creating the host on first use).
     ordered_json Identity() { return ordered_json::parse(Host({"export"}).out)["identity"]; }
-
-    TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(EndToEnd, VersionOfTheDefaultHostInTemplateOrder) {

@@ -2,6 +2,7 @@
 // and removed on a host made by quarnhost, and the status and tardisks of the default host.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -15,12 +16,8 @@ using Result = testsupport::ProcessResult;
 using testsupport::RunProgram;
 using testsupport::TempDir;
 
-class MemfsEndToEnd : public ::testing::Test {
+class MemfsEndToEnd : public e2e::HostFixture {
 protected:
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return RunProgram(QUARNCLI, args);
-    }
     nlohmann::json Json(std::vector<std::string> args) {
         args.insert(args.begin(), {"--formatter", "json"});
         Result r = Cli(args);
@@ -32,9 +29,6 @@ protected:
         for (const auto& row : Json({"system", "mirafs", "ramdisk", "list"})) names.push_back(row["Ramdisk Name"]);
         return names;
     }
-
-    TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(MemfsEndToEnd, ARamdiskIsAddedListedRefusedAndRemoved) {

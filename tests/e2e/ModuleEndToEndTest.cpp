@@ -3,6 +3,7 @@
 // and listed, and refusals as one line with exit status 1.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -15,21 +16,9 @@ namespace {
 using nlohmann::json;
 using Result = testsupport::ProcessResult;
 
-class ModuleEndToEnd : public ::testing::Test {
+class ModuleEndToEnd : public e2e::HostFixture {
 protected:
     void SetUp() override { ASSERT_EQ(Host({"init"}).status, 0); }
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return testsupport::RunProgram(QUARNCLI, args);
-    }
-    Result Json(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--formatter", "json"});
-        return Cli(args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return testsupport::RunProgram(QUARNHOST, args);
-    }
     // The listed module of that name as {"Name", "Is Loaded", "Is Enabled"}.
     json Listed(const std::string& name) {
         Result list = Json({"system", "module", "list"});
@@ -38,9 +27,6 @@ protected:
             if (row["Name"] == name) return row;
         return json();
     }
-
-    testsupport::TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(ModuleEndToEnd, AModuleIsShownAndTheListFilters) {

@@ -4,6 +4,7 @@
 // is the one the next reads.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -18,21 +19,13 @@ using Result = testsupport::ProcessResult;
 using testsupport::RunProgram;
 using testsupport::TempDir;
 
-class PowerEndToEnd : public ::testing::Test {
+class PowerEndToEnd : public e2e::HostFixture {
 protected:
     void SetUp() override {
         // Sleeps on this host return at once.
         testsupport::WriteFile(dir_ / "fast.json", R"({"format": 1, "simulation": {"sleep_percent": 0}})");
         Result init = Host({"init", "--scenario", dir_ / "fast.json"});
         ASSERT_EQ(init.status, 0) << init.err;
-    }
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return RunProgram(QUARNCLI, args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return RunProgram(QUARNHOST, args);
     }
     json Lines(const std::string& text) {
         json lines = json::array();
@@ -43,9 +36,6 @@ protected:
         }
         return lines;
     }
-
-    TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(PowerEndToEnd, AHostInMaintenanceModeRebootsAndIsUpForTheNextCommand) {

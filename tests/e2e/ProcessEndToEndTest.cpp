@@ -3,6 +3,7 @@
 // exits 1, and the journal and the export show the changes.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -17,24 +18,9 @@ using Result = testsupport::ProcessResult;
 using testsupport::RunProgram;
 using testsupport::TempDir;
 
-class ProcessEndToEnd : public ::testing::Test {
+class ProcessEndToEnd : public e2e::HostFixture {
 protected:
     void SetUp() override { Host({"init"}); }
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return RunProgram(QUARNCLI, args);
-    }
-    Result Json(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--formatter", "json"});
-        return Cli(args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return RunProgram(QUARNHOST, args);
-    }
-
-    TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(ProcessEndToEnd, AHostNameSetInOneProcessIsReadInTheNext) {

@@ -3,6 +3,7 @@
 // keyboard layout kept apart for now and later boots.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -15,24 +16,9 @@ namespace {
 using nlohmann::json;
 using Result = testsupport::ProcessResult;
 
-class SettingsEndToEnd : public ::testing::Test {
+class SettingsEndToEnd : public e2e::HostFixture {
 protected:
     void SetUp() override { ASSERT_EQ(Host({"init"}).status, 0); }
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return testsupport::RunProgram(QUARNCLI, args);
-    }
-    Result Json(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--formatter", "json"});
-        return Cli(args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return testsupport::RunProgram(QUARNHOST, args);
-    }
-
-    testsupport::TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(SettingsEndToEnd, AnAdvancedOptionIsChangedListedAndResetThroughTheCommandLine) {

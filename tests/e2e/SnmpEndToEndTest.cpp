@@ -3,6 +3,7 @@
 // framework's own refusal of an engine id with odd characters.
 #include "support/Files.h"
 #include "support/Process.h"
+#include "HostFixture.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -18,19 +19,8 @@ using testsupport::RunProgram;
 using testsupport::TempDir;
 using testsupport::WriteFile;
 
-class SnmpEndToEnd : public ::testing::Test {
+class SnmpEndToEnd : public e2e::HostFixture {
 protected:
-    Result Cli(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--host-state", state_});
-        return RunProgram(QUARNCLI, args);
-    }
-    Result Host(std::vector<std::string> args) {
-        args.insert(args.begin(), {"--state", state_});
-        return RunProgram(QUARNHOST, args);
-    }
-
-    TempDir dir_;
-    const std::string state_ = dir_ / "host";
 };
 
 TEST_F(SnmpEndToEnd, SetInOneProcessIsWhatGetShowsInTheNext) {

@@ -7,6 +7,11 @@
 #include <stdexcept>
 
 namespace plugintest {
+
+void* Plugin() {
+    static void* handle = dlopen(SYSTEM_PLUGIN, RTLD_NOW | RTLD_LOCAL);
+    return handle;
+}
 namespace {
 
 using Kitbase::AutoCli::NamespaceNode;

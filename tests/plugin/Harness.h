@@ -17,6 +17,8 @@
 
 #include <boost/shared_ptr.hpp>
 
+#include <dlfcn.h>
+
 #include <functional>
 #include <map>
 #include <ostream>
@@ -30,6 +32,15 @@ namespace plugintest {
 typedef boost::shared_ptr<Kitbase::AutoCli::Command> CommandPtr;
 typedef boost::shared_ptr<Kitbase::CallSpec::Input> InputPtr;
 typedef boost::shared_ptr<Kitbase::CallSpec::Output> OutputPtr;
+
+// The built plug-in as quarncli loads it (dlopen), kept loaded for the process: commands made by
+// its factories must not outlive its code. Null when it cannot be loaded (dlerror() says why).
+void* Plugin();
+
+// A command made by the exported New() of the loaded plug-in, found by its mangled name; null
+// when the plug-in or the symbol is missing.
+template <class Command>
+CommandPtr FromPlugin(const char* symbol);
 
 // A fresh tree from the entry point, and the command at a path ("system version get").
 boost::shared_ptr<Kitbase::AutoCli::NamespaceNode> BuildTree();
@@ -104,5 +115,13 @@ bool RegisterFaultCase(FaultCase fault_case);
 #define REGISTER_FAULT_CASE(...)                                                        \
     static const bool REGISTER_FAULT_CASE_CAT(fault_case_registered_, __LINE__) =      \
         ::plugintest::RegisterFaultCase(__VA_ARGS__)
+
+template <class Command>
+CommandPtr FromPlugin(const char* symbol) {
+    typedef boost::shared_ptr<Command> (*Factory)();
+    void* found = Plugin() ? dlsym(Plugin(), symbol) : nullptr;
+    if (!found) return CommandPtr();
+    return reinterpret_cast<Factory>(found)();
+}
 
 }  // namespace plugintest

@@ -32,20 +32,8 @@ using nlohmann::json;
 const std::string kInfoNew = "NorlithCtl::System::SystemInfoImpl::SystemInfoImpl";
 const std::string kByName = "NorlithCtl::System::SystemInfoImpl::GetModuleByName";
 
-// The plug-in as quarncli loads it, kept loaded for the process (commands made by its factories
-// must not outlive its code).
-void* Plugin() {
-    static void* handle = dlopen(SYSTEM_PLUGIN, RTLD_NOW | RTLD_LOCAL);
-    return handle;
-}
-
-template <class Command>
-plugintest::CommandPtr FromPlugin(const char* symbol) {
-    typedef boost::shared_ptr<Command> (*Factory)();
-    void* found = Plugin() ? dlsym(Plugin(), symbol) : nullptr;
-    if (!found) return plugintest::CommandPtr();
-    return reinterpret_cast<Factory>(found)();
-}
+using plugintest::FromPlugin;
+using plugintest::Plugin;
 
 plugintest::CommandPtr MakeList() {
     return FromPlugin<KernelLogList>("_ZN9TarselCli6System13KernelLogList3NewEv");

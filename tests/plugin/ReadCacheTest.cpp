@@ -24,21 +24,8 @@ using Kitbase::MetaObj::MetaStruct;
 
 const std::string kNew = "NorlithCtl::System::SystemInfoImpl::SystemInfoImpl";
 
-// The plug-in as quarncli loads it, kept loaded for the process (commands made by its factories
-// must not outlive its code).
-void* Plugin() {
-    static void* handle = dlopen(SYSTEM_PLUGIN, RTLD_NOW | RTLD_LOCAL);
-    return handle;
-}
-
-// A command made by the exported New() of the loaded plug-in, found by its mangled name.
-template <class Command>
-plugintest::CommandPtr FromPlugin(const char* symbol) {
-    typedef boost::shared_ptr<Command> (*Factory)();
-    void* found = Plugin() ? dlsym(Plugin(), symbol) : nullptr;
-    if (!found) return plugintest::CommandPtr();
-    return reinterpret_cast<Factory>(found)();
-}
+using plugintest::FromPlugin;
+using plugintest::Plugin;
 
 plugintest::CommandPtr MakeGet() {
     return FromPlugin<ReadCacheGet>("_ZN9TarselCli6System12ReadCacheGet3NewEv");
