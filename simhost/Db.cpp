@@ -118,6 +118,10 @@ void Db::EmptyWal() const noexcept {
 }
 
 void Db::Open() {
+    // A writer killed in the middle of a change leaves a hot journal, which only a read-write
+    // connection can roll back: such a host is opened read-write, and its first read puts it
+    // back to its last committed state.
+    if (mode_ == Mode::ReadOnly && HasJournal()) mode_ = Mode::ReadWrite;
     int flags = SQLITE_OPEN_NOMUTEX | (no_follow_ ? SQLITE_OPEN_NOFOLLOW : 0);
     if (mode_ == Mode::ReadOnly)
         flags |= SQLITE_OPEN_READONLY;
@@ -131,26 +135,33 @@ void Db::Open() {
         throw HostError("'" + shown_as_ + "': " + reason);
     }
     sqlite3_extended_result_codes(db_, 1);
-    // Writers queue for each other instead of failing at once.
+    // Writers queue for each other, and readers for a committing writer, instead of failing.
     sqlite3_busy_timeout(db_, 10000);
-    // Keep the WAL file between processes: no file creation and removal per invocation.
+    // Hosts use a rollback journal: a process that only reads then takes one shared lock on the
+    // file and opens nothing else. (Hosts made by earlier builds are in WAL mode; they keep it,
+    // with their WAL file kept between processes but emptied by the last connection to close.)
     int persist = 1;
     sqlite3_file_control(db_, "main", SQLITE_FCNTL_PERSIST_WAL, &persist);
     try {
-        // WAL with NORMAL keeps every committed transaction across a killed process. The last
-        // writer to close checkpoints the WAL and, with a size limit of 0, empties it: a WAL left
-        // with content would be read and checksummed again by every later process that opens
-        // the host first (about a millisecond for a freshly created host's).
-        Exec(mode_ == Mode::ReadOnly
-                 ? std::string(kConnectionSettings)
-                 : std::string(kConnectionSettings) +
-                       ";PRAGMA synchronous=NORMAL;PRAGMA journal_size_limit=0",
-             "cannot open");
+        Exec(kConnectionSettings, "cannot open");
+        if (mode_ != Mode::ReadOnly) {
+            // A WAL host loses nothing committed with NORMAL; a rollback journal keeps the
+            // default, FULL, which syncs the journal before the file is changed.
+            Query mode = Cached("PRAGMA journal_mode");
+            if (mode->Step() && mode->Text(0) == "wal")
+                Exec("PRAGMA synchronous=NORMAL;PRAGMA journal_size_limit=0", "cannot open");
+        }
     } catch (...) {
+        cache_.clear();
         sqlite3_close_v2(db_);
         db_ = nullptr;
         throw;
     }
+}
+
+bool Db::HasJournal() const {
+    struct stat info {};
+    return lstat((path_ + "-journal").c_str(), &info) == 0 && info.st_size > 0;
 }
 
 void Db::MakeWritable() {

@@ -85,8 +85,8 @@ public:
     };
 
     // Opens the database file at path. With no_follow, the open is refused when path or any of
-    // its components is a symbolic link (give it a resolved path), and so are the -wal and -shm
-    // files. shown_as is the name used in messages (default: path).
+    // its components is a symbolic link (give it a resolved path), and so are the journal, -wal
+    // and -shm files. shown_as is the name used in messages (default: path).
     Db(const std::string& path, Mode mode, bool no_follow = false, std::string shown_as = {});
     ~Db();
     Db(const Db&) = delete;
@@ -125,6 +125,9 @@ public:
 
 private:
     void Open();
+    // Whether a journal with content lies beside the file (a change in progress, or one a
+    // killed writer left to roll back).
+    bool HasJournal() const;
 
     sqlite3* db_ = nullptr;
     std::string path_;

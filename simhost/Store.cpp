@@ -3,8 +3,6 @@
 #include <simhost/State.h>
 #include <simhost/Host.h>
 
-#include <sqlite3.h>
-
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
@@ -166,7 +164,8 @@ private:
 // Refuses DIR/host.db unless it is a regular file that starts with a SQLite header carrying our
 // application id, reading it without SQLite: SQLite would write into a foreign database it
 // opens (rolling back a hot journal, checkpointing a WAL when the connection closes) and leave
-// -wal and -shm files beside it. The -wal and -shm files must not be symbolic links either.
+// -wal and -shm files beside it. Its journal, -wal and -shm files must not be symbolic links
+// either.
 void CheckDatabaseFile(const std::string& dir) {
     std::string path = DatabasePath(dir);
     Fd fd(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
@@ -192,7 +191,7 @@ void CheckDatabaseFile(const std::string& dir) {
                        (std::uint32_t{header[70]} << 8) | std::uint32_t{header[71]};
     if (id != static_cast<std::uint32_t>(kApplicationId))
         Refuse(Quoted(path) + " is not a simulated host database");
-    for (const char* suffix : {"-wal", "-shm"})
+    for (const char* suffix : {"-journal", "-wal", "-shm"})
         if (Inspect(path + suffix) == Entry::Link)
             Refuse(Quoted(path + suffix) + " is a symbolic link");
 }
@@ -285,15 +284,11 @@ void BuildDatabase(const std::string& path, const Scenario& scenario, const Stag
     for (const char* suffix : {"", "-journal", "-wal", "-shm"}) std::remove((path + suffix).c_str());
     Db db(path, Db::Mode::Create);
     db.Exec("PRAGMA application_id=" + std::to_string(kApplicationId) + ";" +
-            "PRAGMA user_version=" + std::to_string(SchemaVersion()) + ";" +
-            "PRAGMA journal_mode=WAL;");
+            "PRAGMA user_version=" + std::to_string(SchemaVersion()));
     WriteTxn txn(db);
     db.Exec(FullSchema());
     WriteState(db, scenario, root.Path());
     txn.Commit();
-    // Closing checkpoints everything into the file; its WAL is not to outlive it.
-    int persist = 0;
-    sqlite3_file_control(db.Handle(), "main", SQLITE_FCNTL_PERSIST_WAL, &persist);
 }
 
 // Builds the host under temporary names and switches it into place; the caller holds the

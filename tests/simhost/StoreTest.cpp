@@ -152,18 +152,69 @@ TEST_F(StoreTest, CorruptOrForeignDatabasesAreRefusedAndLeftAlone) {
     simhost::Db foreign(dir / "foreign/host.db", simhost::Db::Mode::ReadOnly);
     EXPECT_EQ(foreign.QueryInt("SELECT count(*) FROM accounts"), 1);
 }
-// A process whose tool wrote to the host while it read (maintenance mode's kelp-cmd) closes last:
-// it empties the WAL, so later processes do not read the tool's changes from it again.
-TEST_F(StoreTest, TheLastConnectionToCloseLeavesTheWalEmpty) {
+// A host keeps a rollback journal, so a process that only reads leaves nothing beside the file.
+TEST_F(StoreTest, AHostIsReadWithoutJournalOrWalFiles) {
+    TempDir dir;
+    simhost::Host host(dir / "h");
+    host.Init();
+    std::string uuid = UuidOf(host.Dir());
+    host.ClearJournal();  // a write
+    EXPECT_EQ(UuidOf(host.Dir()), uuid);
+    auto files = Snapshot(host.Dir());  // the process's connection still open
+    for (const char* suffix : {"-journal", "-wal", "-shm"})
+        EXPECT_EQ(files.count(std::string("host.db") + suffix), 0u) << suffix;
+}
+
+// A writer killed in the middle of a change, after some of it reached the file, leaves a hot
+// journal: the next process, even one that only reads, sees the last committed state.
+TEST_F(StoreTest, AChangeCutShortByAKilledWriterIsRolledBackByTheNextReader) {
+    TempDir dir;
+    simhost::Host host(dir / "h");
+    host.Init();
+    std::string before = host.Export();
+    simhost::CloseHost();
+    std::string path = simhost::DatabasePath(host.Dir());
+    int pid = testsupport::ForkChild(
+        [](void* context) {
+            simhost::Db db(*static_cast<std::string*>(context), simhost::Db::Mode::ReadWrite);
+            // A page cache of one page spills the change into the file before any commit.
+            db.Exec("PRAGMA cache_size=1; BEGIN IMMEDIATE; DELETE FROM items;"
+                    "CREATE TABLE scratch(x);"
+                    "WITH RECURSIVE n(i) AS (SELECT 1 UNION ALL SELECT i + 1 FROM n WHERE i < 500)"
+                    " INSERT INTO scratch SELECT randomblob(900) FROM n;");
+            raise(SIGKILL);
+            return 0;
+        },
+        &path);
+    ASSERT_EQ(testsupport::WaitChild(pid), 128 + SIGKILL);
+    struct stat info {};
+    ASSERT_EQ(stat((path + "-journal").c_str(), &info), 0);
+    ASSERT_GT(info.st_size, 0);
+
+    EXPECT_FALSE(UuidOf(host.Dir()).empty());
+    EXPECT_EQ(host.Export(), before);
+    EXPECT_TRUE(stat((path + "-journal").c_str(), &info) != 0 || info.st_size == 0);
+    simhost::Db db(path, simhost::Db::Mode::ReadOnly);
+    EXPECT_EQ(db.QueryInt("SELECT count(*) FROM sqlite_schema WHERE name = 'scratch'"), 0);
+}
+
+// A host made by an earlier build is in WAL mode. A process whose tool wrote to it while it
+// read (maintenance mode's kelp-cmd) closes last: it empties the WAL, so later processes do not
+// read the tool's changes from it again.
+TEST_F(StoreTest, AWalHostIsLeftWithAnEmptyWalByItsLastConnection) {
     TempDir dir;
     simhost::Host host(dir / "h");
     host.Init();
     const std::string path = simhost::DatabasePath(host.Dir());
+    {
+        simhost::Db db(path, simhost::Db::Mode::ReadWrite);
+        db.Exec("PRAGMA journal_mode=WAL");
+    }
     auto walBytes = [&] {
         struct stat info {};
         return stat((path + "-wal").c_str(), &info) == 0 ? info.st_size : 0;  // absent: empty
     };
-    EXPECT_EQ(walBytes(), 0) << "creating the host leaves no WAL behind";
+    EXPECT_EQ(walBytes(), 0);
     {
         simhost::Db reader(path, simhost::Db::Mode::ReadOnly);
         reader.Exec("SELECT count(*) FROM items");
