@@ -71,7 +71,7 @@ bool PluginSet::LoadDirectory(const std::string& directory,
     }
     for (std::size_t i = 0; i < names.size(); ++i) {
         std::string path = directory + "/" + names[i];
-        void* handle = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
+        void* handle = dlopen(path.c_str(), RTLD_LAZY | RTLD_LOCAL);
         if (handle == nullptr) {
             const char* why = dlerror();
             problems->push_back("cannot load plug-in " + QuotePath(path) + ": " +

@@ -4,7 +4,9 @@
 // PluginSet owns the library handles and closes them, in reverse order, when it is destroyed;
 // whatever holds objects made by a plug-in (the command tree, results) must be gone by then.
 // A plug-in that cannot be opened, lacks the entry point, or throws from it is reported in one
-// line naming the file, and the others still load.
+// line naming the file, and the others still load. Plug-ins are opened with lazy binding: a
+// command line runs one command, so the loader resolves only the functions that command calls
+// (the plug-in tests open it with every symbol bound, so a missing one is found there).
 //
 // DefaultPluginDir finds the directory next to the running program; when the program's own
 // location cannot be read it fails rather than fall back to a directory relative to the
