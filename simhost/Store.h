@@ -39,7 +39,12 @@ SIMHOST_API std::string RootPath(const std::string& dir);
 
 // The schema version stored in every host database; derived from the DDL of the core tables and
 // of every domain, so any schema change makes older databases recognisably different.
+// DerivedSchemaVersion() always derives it (once per process); SchemaVersion() is the version a
+// program gave with UseSchemaVersion(), which a short-lived program does with the value derived
+// when it was built (cli/CMakeLists.txt), and otherwise the derived one.
 SIMHOST_API std::int32_t SchemaVersion();
+SIMHOST_API std::int32_t DerivedSchemaVersion();
+SIMHOST_API void UseSchemaVersion(std::int32_t version);
 
 enum class InitMode {
     OpenOrCreate,  // create from the scenario unless a host exists (first use)

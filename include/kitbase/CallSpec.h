@@ -25,8 +25,9 @@
 namespace Kitbase {
 namespace CallSpec {
 
-// Parameter kinds; the values are part of the plug-in interface.
-enum ParameterType {
+// Parameter kinds; the values are part of the plug-in interface. (Of a fixed underlying type, so
+// that a value this framework does not know, from a newer plug-in say, is one it can refuse.)
+enum ParameterType : int {
     ParameterTypeString = 0,
     ParameterTypeInt = 1,
     ParameterTypeBool = 2,  // takes a value: --enable=true
@@ -34,7 +35,7 @@ enum ParameterType {
 };
 
 // Constraint kinds; the values are part of the plug-in interface.
-enum ParameterConstraintType {
+enum ParameterConstraintType : int {
     ConstraintIntRange = 1,     // inclusive 64-bit signed bounds
     ConstraintStringRegex = 4,  // the pattern must match the whole value
 };

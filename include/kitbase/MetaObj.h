@@ -23,7 +23,7 @@ namespace MetaObj {
 
 // The kind of a meta object. The values of MetaTypeString and MetaTypeStruct are part of the
 // plug-in interface.
-enum MetaType {
+enum MetaType : int {
     MetaTypeBool = 0,
     MetaTypeInt = 1,
     MetaTypeString = 2,

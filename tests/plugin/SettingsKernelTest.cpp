@@ -188,7 +188,9 @@ TEST_F(KernelCommands, ValuesTheTypeRefusesAreReportedAndNothingChanges) {
         {"pages", "-1"}, {"pages", "4294967296"}, {"pages", "12abc"}, {"pages", ""},
         {"level", "256"}, {"fastBoot", "yes"}, {"fastBoot", "1"}, {"banner", "a\nb"},
     };
-    for (const auto& [name, value] : refused) {
+    for (const auto& entry : refused) {
+        const std::string& name = entry.first;
+        const std::string& value = entry.second;
         plugintest::Run run = Run(SettingsKernelSet::New(), [&](CallSpec::Input& in) {
             in.SetString("setting", name);
             in.SetString("value", value);

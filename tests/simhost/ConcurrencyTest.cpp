@@ -169,7 +169,7 @@ TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
             [](void* raw) {
                 Context* context = static_cast<Context*>(raw);
                 context->line.Wait();
-                for (int round = 0; round < 40; ++round) {
+                for (int round = 0; round < 20; ++round) {
                     std::string text = simhost::Host(context->dir).Export();
                     if (!simtest::Holds(text, context->first) && !simtest::Holds(text, context->second))
                         return 1;
@@ -178,7 +178,7 @@ TEST_F(ConcurrencyTest, ReadersNeverSeeAHalfReplacedHost) {
             },
             &context));
     context.line.Release();
-    for (int round = 0; round < 15; ++round)
+    for (int round = 0; round < 8; ++round)
         simtest::RunQuarnhost({"--state", host.Dir(), "init", "--force", "--scenario",
                                simtest::ScenarioFile(round % 2 ? "no-netboot.json" : "stateless.json")});
     for (int pid : pids) EXPECT_EQ(testsupport::WaitChild(pid), 0);

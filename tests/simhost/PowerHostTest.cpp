@@ -23,8 +23,6 @@
 #include <csignal>
 #include <dirent.h>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <sstream>
 #include <string>
 #include <sys/resource.h>
@@ -195,8 +193,7 @@ TEST_F(PowerHostTest, EveryHostHasTheToolWhichExportsLeaveOut) {
     EXPECT_TRUE(S_ISREG(info.st_mode) && (info.st_mode & 0111));
     const std::string built = simhost::image::BuiltProgram("/bin/kelp-cmd");
     ASSERT_FALSE(built.empty());
-    std::ifstream a(tool, std::ios::binary), b(built, std::ios::binary);
-    EXPECT_TRUE(std::equal(std::istreambuf_iterator<char>(a), {}, std::istreambuf_iterator<char>(b)));
+    EXPECT_TRUE(testsupport::ReadFile(tool) == testsupport::ReadFile(built)) << "a copy of the built tool";
 
     const std::string exported = host_.host().Export();
     const json document = json::parse(exported);  // alive while its files are walked

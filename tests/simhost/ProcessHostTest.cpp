@@ -63,7 +63,9 @@ TEST_F(ProcessHostTest, HostNamesFollowRfc1123AndRefusalsNameValueAndRule) {
         {std::string(64, 'h'), "Invalid host name '" + std::string(64, 'h') + "': it is 64 characters long" + rule},
     };
     DnsConfigImpl dns("defaultTcpipStack");
-    for (const auto& [name, message] : bad) {
+    for (const auto& entry : bad) {
+        const std::string& name = entry.first;
+        const std::string& message = entry.second;
         SCOPED_TRACE(name);
         EXPECT_EQ(Refusal([&] { dns.SetHostname(name, true); }), message);
         EXPECT_EQ(Refusal([&] { dns.SetHostname(name, false); }), message);
@@ -93,7 +95,9 @@ TEST_F(ProcessHostTest, DomainsAndFqdnsAreLabelsJoinedByDots) {
         {"lab net", "it contains a blank"},
         {"lab\nnet", "it contains the control character \\x0a"},
     };
-    for (const auto& [domain, problem] : bad) {
+    for (const auto& entry : bad) {
+        const std::string& domain = entry.first;
+        const std::string& problem = entry.second;
         SCOPED_TRACE(domain);
         std::string message = Refusal([&] { dns.SetDomain(domain, false); });
         EXPECT_NE(message.find(problem), std::string::npos) << message;

@@ -393,16 +393,24 @@ TEST_F(StoreTest, SymbolicLinksInTheStateDirectoryAreRefused) {
                   "' is a symbolic link");
     EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere.lock"));
 
-    std::filesystem::copy(real.Dir(), dir / "root", std::filesystem::copy_options::recursive);
+    // A copy of the host's database with an empty root/ (the root's files play no part here).
+    auto copy_host = [&](const std::string& to) {
+        std::filesystem::create_directories(to + "/root");
+        std::filesystem::copy_file(simhost::DatabasePath(real.Dir()), simhost::DatabasePath(to));
+    };
+    copy_host(dir / "root");
     std::filesystem::remove_all(dir / "root/root");
     std::filesystem::create_directory_symlink(dir / "real/root", dir / "root/root");
     expect_refused(dir / "root", dir / "root/root");
 
-    std::filesystem::copy(real.Dir(), dir / "wal", std::filesystem::copy_options::recursive);
-    std::filesystem::remove(dir / "wal/host.db-wal");
-    std::filesystem::create_symlink(dir / "elsewhere-wal", dir / "wal/host.db-wal");
-    expect_refused(dir / "wal", dir / "wal/host.db-wal");
-    EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere-wal"));
+    for (const char* suffix : {"-journal", "-wal", "-shm"}) {
+        std::string state = dir / (std::string("companion") + suffix);
+        copy_host(state);
+        std::string link = simhost::DatabasePath(state) + suffix;
+        std::filesystem::create_symlink(dir / "elsewhere", link);
+        expect_refused(state, link);
+        EXPECT_FALSE(std::filesystem::exists(dir / "elsewhere")) << suffix;
+    }
     EXPECT_EQ(Snapshot(real.Dir()), untouched);
 
     // The state directory itself may be reached through a link.
