@@ -6,16 +6,7 @@
 # resident memory of `system coredump partition list` and `system coredump file list`, and
 # their cost per row above a host without partitions and files. Target: flat within 25%.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-host="$build/bin/quarnhost"
-for tool in hyperfine:hyperfine time:/usr/bin/time python3:python3; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}" python3:python3
 
 # A scenario of n diagnostic partitions and n dump files of 100 MB each (n may be 0).
 generate() {

@@ -4,16 +4,8 @@
 #   bench/latency.sh [BUILD_DIR]
 # Targets: at most 1.6x the time of `date -u`; under 6 MiB peak memory.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-for tool in hyperfine:hyperfine time:/usr/bin/time; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-state="$(mktemp -d)"
-trap 'rm -rf "$state"' EXIT
-export QUARN_HOST_STATE="$state/host"
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}"
+export QUARN_HOST_STATE="$work/host"
 "$cli" system version get >/dev/null   # first use creates the host; not part of the measure
 
 out="$(mktemp)"

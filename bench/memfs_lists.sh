@@ -11,15 +11,10 @@
 # without rows, divided by the rows. Hosts are made (quarnhost init) before and outside the
 # measure.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}"
 shift || true
 sizes=("$@")
 [ ${#sizes[@]} -gt 0 ] || sizes=(1000 10000 100000)
-cli="$build/bin/quarncli"
-if ! [ -x /usr/bin/time ]; then apt-get install -y -qq time >/dev/null; fi
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
 
 # A host of n ramdisks (/rd/000001 ...) and n tardisks.
 scenario() {

@@ -11,16 +11,7 @@
 #    25% from 1k to 100k.
 # 3. `module list --loaded false` on the 100k host: the filter costs the same walk.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-host="$build/bin/quarnhost"
-for tool in hyperfine:hyperfine time:/usr/bin/time python3:python3 kmod:lsmod; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}" python3:python3 kmod:lsmod
 
 # A scenario of n modules (n may be 0) and a few log levels per hundred modules.
 generate() {

@@ -9,17 +9,8 @@
 # small write transactions) no slower than another write such as `system welcomemsg set`;
 # every process under 6 MiB.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-host="$build/bin/quarnhost"
-for tool in hyperfine:hyperfine time:/usr/bin/time; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-state="$(mktemp -d)"
-trap 'rm -rf "$state"' EXIT
-export QUARN_HOST_STATE="$state/host"
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}"
+export QUARN_HOST_STATE="$work/host"
 echo '{"format": 1, "simulation": {"sleep_percent": 0}, "maintenance": {"state": "disabled"}}' |
   "$host" init --scenario - >/dev/null
 
@@ -31,7 +22,7 @@ out_set="$(mktemp)"
 # Before each run the tool itself takes the host out of maintenance mode (it succeeds also when
 # the host is out already), so every measured run enters it.
 hyperfine -N --warmup 20 --runs 300 --export-json "$out_set" \
-  --prepare "$state/host/root/bin/kelp-cmd hostsvc/maintenance_mode_exit 0" \
+  --prepare "$work/host/root/bin/kelp-cmd hostsvc/maintenance_mode_exit 0" \
   "$cli system maintenanceMode set -e true" "$cli system welcomemsg set -m banner" >/dev/null
 python3 - "$out" "$out_set" <<'PY'
 import json, sys
@@ -48,4 +39,4 @@ rss() { /usr/bin/time -f %M "$@" 2>&1 >/dev/null | tail -1; }
 mib() { awk -v k="$1" 'BEGIN { printf "%6.2f MiB", k / 1024 }'; }
 echo "peak RSS quarncli system time get        $(mib "$(rss "$cli" system time get)")"
 echo "peak RSS quarncli maintenanceMode set    $(mib "$(rss "$cli" system maintenanceMode set -e true)")"
-echo "peak RSS kelp-cmd maintenance_mode_exit  $(mib "$(rss "$state/host/root/bin/kelp-cmd" hostsvc/maintenance_mode_exit 60)")"
+echo "peak RSS kelp-cmd maintenance_mode_exit  $(mib "$(rss "$work/host/root/bin/kelp-cmd" hostsvc/maintenance_mode_exit 60)")"

@@ -6,16 +6,7 @@
 #   bench/process_list.sh [BUILD_DIR]
 # Target: the cost per world stays flat (within 25%) from 1k to 100k worlds.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-host="$build/bin/quarnhost"
-for tool in hyperfine:hyperfine time:/usr/bin/time procps:ps; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}" procps:ps
 
 # The hosts: the default one, one without worlds (the fixed cost) and the generated ones.
 "$host" --state "$work/default" init >/dev/null

@@ -8,16 +8,7 @@
 #    `kernel list`, and their cost per row above an empty host's. Target: flat within 25%.
 # 3. `advanced list --option` on the 100k host beside the default host. Target: about the same.
 set -euo pipefail
-root="$(cd "$(dirname "${BASH_SOURCE[0]}")/.." && pwd)"
-build="${1:-$root/build}"
-cli="$build/bin/quarncli"
-host="$build/bin/quarnhost"
-for tool in hyperfine:hyperfine time:/usr/bin/time python3:python3 procps:sysctl; do
-  pkg="${tool%%:*}" bin="${tool#*:}"
-  if ! command -v "$bin" >/dev/null; then apt-get install -y -qq "$pkg" >/dev/null; fi
-done
-work="$(mktemp -d)"
-trap 'rm -rf "$work"' EXIT
+source "$(dirname "${BASH_SOURCE[0]}")/common.sh" "${1:-}" python3:python3 procps:sysctl
 
 # A scenario of n advanced options and n kernel settings (n may be 0).
 generate() {

@@ -13,6 +13,23 @@ namespace {
 
 bool IsBlank(char c) { return c == ' ' || c == '\t'; }
 
+// The words of an option string: the runs of characters between blanks.
+std::vector<std::string> Words(const std::string& text) {
+    std::vector<std::string> words;
+    std::size_t at = 0;
+    while (at < text.size()) {
+        if (IsBlank(text[at])) {
+            ++at;
+            continue;
+        }
+        std::size_t end = at;
+        while (end < text.size() && !IsBlank(text[end])) ++end;
+        words.push_back(text.substr(at, end - at));
+        at = end;
+    }
+    return words;
+}
+
 bool IsControl(unsigned char c) { return c < 0x20 || c == 0x7f; }
 
 bool NameChars(const std::string& text, bool module) {
@@ -78,15 +95,7 @@ std::string ParseOptions(const std::string& text, Pairs& pairs) {
         return "the option string is " + std::to_string(text.size()) + " bytes long; at most " +
                std::to_string(kMaxOptionString) + " are accepted";
     std::set<std::string> seen;
-    std::size_t at = 0;
-    while (at < text.size()) {
-        if (IsBlank(text[at])) {
-            ++at;
-            continue;
-        }
-        std::size_t end = at;
-        while (end < text.size() && !IsBlank(text[end])) ++end;
-        const std::string word = text.substr(at, end - at);
+    for (const std::string& word : Words(text)) {
         for (unsigned char c : word)
             if (IsControl(c))
                 return "the option string holds a control character in " + QuoteName(word) +
@@ -107,22 +116,13 @@ std::string ParseOptions(const std::string& text, Pairs& pairs) {
         if (!seen.insert(name).second)
             return "parameter " + QuoteName(name) + " is given twice";
         pairs.emplace_back(std::move(name), std::move(value));
-        at = end;
     }
     return "";
 }
 
 Pairs LenientPairs(const std::string& text) {
     Pairs pairs;
-    std::size_t at = 0;
-    while (at < text.size()) {
-        if (IsBlank(text[at])) {
-            ++at;
-            continue;
-        }
-        std::size_t end = at;
-        while (end < text.size() && !IsBlank(text[end])) ++end;
-        const std::string word = text.substr(at, end - at);
+    for (const std::string& word : Words(text)) {
         const std::size_t equals = word.find('=');
         if (equals != std::string::npos && equals > 0) {
             std::string name = word.substr(0, equals);
@@ -134,7 +134,6 @@ Pairs LenientPairs(const std::string& text) {
                 }
             if (!known) pairs.emplace_back(name, word.substr(equals + 1));
         }
-        at = end;
     }
     return pairs;
 }

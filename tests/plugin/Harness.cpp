@@ -2,6 +2,9 @@
 
 #include <norlithctl/RavelException.h>
 #include <norlithctl/Testing.h>
+#include <simhost/Trace.h>
+
+#include <gtest/gtest.h>
 
 #include <sstream>
 #include <stdexcept>
@@ -70,6 +73,17 @@ Run Execute(const CommandPtr& command, const InputPtr& input) {
         run.exception = error.what();
     }
     run.leaked = NorlithCtl::Testing::LiveObjects() - before;
+    return run;
+}
+
+Run ExecuteClean(const CommandPtr& command,
+                 const std::function<void(Kitbase::CallSpec::Input&)>& fill) {
+    InputPtr input = Kitbase::CallSpec::Input::New();
+    if (fill) fill(*input);
+    simhost::trace::Take();
+    Run run = Execute(command, input);
+    EXPECT_FALSE(run.escaped) << run.exception;
+    EXPECT_EQ(run.leaked, 0);
     return run;
 }
 

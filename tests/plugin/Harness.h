@@ -58,6 +58,10 @@ struct Run {
 };
 // Executes command with input (empty input when null) and reports what happened.
 Run Execute(const CommandPtr& command, const InputPtr& input = InputPtr());
+// Executes command with the input fill makes, after emptying the call trace (which then holds
+// this execution's host calls), and expects it neither to let an exception escape nor to leak.
+Run ExecuteClean(const CommandPtr& command,
+                 const std::function<void(Kitbase::CallSpec::Input&)>& fill = {});
 
 // How a command answers one failing host operation.
 struct Outcome {

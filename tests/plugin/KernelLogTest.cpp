@@ -78,18 +78,9 @@ protected:
     }
     void TearDown() override { simhost::trace::Disable(); }
 
-    plugintest::Run Run(const plugintest::CommandPtr& command, std::function<void(CallSpec::Input&)> fill = {}) {
-        InputPtr input = CallSpec::Input::New();
-        if (fill) fill(*input);
-        simhost::trace::Take();
-        plugintest::Run run = plugintest::Execute(command, input);
-        EXPECT_FALSE(run.escaped) << run.exception;
-        EXPECT_EQ(run.leaked, 0);
-        return run;
-    }
     // "name current/default" per row, or the errors.
     std::vector<std::string> Levels(std::function<void(CallSpec::Input&)> fill = {}) {
-        plugintest::Run run = Run(MakeList(), fill);
+        plugintest::Run run = plugintest::ExecuteClean(MakeList(), fill);
         std::vector<std::string> rows = run.output->GetErrors();
         auto list = boost::dynamic_pointer_cast<MetaList>(run.output->GetResult());
         if (!list) return rows;
@@ -105,7 +96,7 @@ protected:
     }
     // The errors of a set, or "true" for success.
     std::string Set(std::function<void(CallSpec::Input&)> fill) {
-        plugintest::Run run = Run(MakeSet(), fill);
+        plugintest::Run run = plugintest::ExecuteClean(MakeSet(), fill);
         if (!run.output->GetErrors().empty()) {
             EXPECT_FALSE(run.output->GetResult());
             return run.output->GetErrors().front();

@@ -351,18 +351,9 @@ protected:
     void TearDown() override { simhost::trace::Disable(); }
 
     plugintest::Run List(std::function<void(CallSpec::Input&)> fill = {}) {
-        return Run(SettingsAdvancedList::New(), fill);
+        return plugintest::ExecuteClean(SettingsAdvancedList::New(), fill);
     }
-    plugintest::Run Set(std::function<void(CallSpec::Input&)> fill) { return Run(SettingsAdvancedSet::New(), fill); }
-    plugintest::Run Run(const plugintest::CommandPtr& command, std::function<void(CallSpec::Input&)> fill) {
-        InputPtr input = CallSpec::Input::New();
-        if (fill) fill(*input);
-        simhost::trace::Take();
-        plugintest::Run run = plugintest::Execute(command, input);
-        EXPECT_FALSE(run.escaped) << run.exception;
-        EXPECT_EQ(run.leaked, 0);
-        return run;
-    }
+    plugintest::Run Set(std::function<void(CallSpec::Input&)> fill) { return plugintest::ExecuteClean(SettingsAdvancedSet::New(), fill); }
     simhost::TempHost host_{kTree};
 };
 

@@ -113,20 +113,11 @@ protected:
     void SetUp() override { simhost::trace::Enable(); }
     void TearDown() override { simhost::trace::Disable(); }
 
-    plugintest::Run Run(const plugintest::CommandPtr& command, std::function<void(CallSpec::Input&)> fill = {}) {
-        InputPtr input = CallSpec::Input::New();
-        if (fill) fill(*input);
-        simhost::trace::Take();
-        plugintest::Run run = plugintest::Execute(command, input);
-        EXPECT_FALSE(run.escaped) << run.exception;
-        EXPECT_EQ(run.leaked, 0);
-        return run;
-    }
     simhost::TempHost host_{kSettings};
 };
 
 TEST_F(KernelCommands, EverySettingInTheHostsOrderWithUnsetRuntimeShown) {
-    plugintest::Run run = Run(SettingsKernelList::New());
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelList::New());
     EXPECT_TRUE(run.output->IsComplete());
     EXPECT_EQ(Rows(run.output->GetResult()),
               (std::vector<std::string>{"banner|string|text|hi|hi|hi", "fastBoot|bool|flag|FALSE|<unset>|TRUE",
@@ -140,23 +131,23 @@ TEST_F(KernelCommands, EverySettingInTheHostsOrderWithUnsetRuntimeShown) {
 }
 
 TEST_F(KernelCommands, DeltaListsOnlyWhatDiffersByType) {
-    plugintest::Run run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetFlag("delta"); });
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetFlag("delta"); });
     // pages: 0x10 is 16; level: runtime 2 differs from 1; bigSize's type is never a delta.
     EXPECT_EQ(Rows(run.output->GetResult()),
               (std::vector<std::string>{"fastBoot|bool|flag|FALSE|<unset>|TRUE", "level|uint8|small|1|2|1"}));
 }
 
 TEST_F(KernelCommands, OneSettingByNameAndAnUnknownNameFails) {
-    plugintest::Run run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "pages"); });
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "pages"); });
     EXPECT_EQ(Rows(run.output->GetResult()), (std::vector<std::string>{"pages|uint32|count|0x10|16|16"}));
     EXPECT_EQ(simhost::trace::TakeOperations().at(1), kType) << "no list of names is read";
 
-    run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "page"); });
+    run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "page"); });
     EXPECT_EQ(run.output->GetErrors(), (std::vector<std::string>{"Unknown kernel setting 'page' (nearest: pages)"}));
     EXPECT_FALSE(run.output->GetResult());
 
     // Under delta a setting that equals its default yields an empty list.
-    run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) {
+    run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) {
         in.SetString("option", "banner");
         in.SetFlag("delta");
     });
@@ -165,18 +156,18 @@ TEST_F(KernelCommands, OneSettingByNameAndAnUnknownNameFails) {
 }
 
 TEST_F(KernelCommands, SetChangesTheConfiguredValueAndTheNextBootRunsWithIt) {
-    plugintest::Run run = Run(SettingsKernelSet::New(), [](CallSpec::Input& in) {
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelSet::New(), [](CallSpec::Input& in) {
         in.SetString("setting", "pages");
         in.SetString("value", "0x40");
     });
     EXPECT_TRUE(run.output->GetErrors().empty());
     EXPECT_TRUE(boost::dynamic_pointer_cast<Kitbase::MetaObj::MetaBool>(run.output->GetResult())->GetValue());
     EXPECT_EQ(simhost::trace::TakeOperations(), (std::vector<std::string>{kNew, kSet}));
-    run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "pages"); });
+    run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetString("option", "pages"); });
     EXPECT_EQ(Rows(run.output->GetResult()), (std::vector<std::string>{"pages|uint32|count|0x40|16|16"}));
 
     ASSERT_EQ(NorlithCtl::Os::Env::Default()->Kill(1, SIGTERM), 0);
-    run = Run(SettingsKernelList::New());
+    run = plugintest::ExecuteClean(SettingsKernelList::New());
     std::vector<std::string> rows = Rows(run.output->GetResult());
     EXPECT_EQ(rows[2], "pages|uint32|count|0x40|0x40|16");
     EXPECT_EQ(rows[1], "fastBoot|bool|flag|FALSE|<unset>|TRUE") << "a setting without runtime value keeps none";
@@ -191,7 +182,7 @@ TEST_F(KernelCommands, ValuesTheTypeRefusesAreReportedAndNothingChanges) {
     for (const auto& entry : refused) {
         const std::string& name = entry.first;
         const std::string& value = entry.second;
-        plugintest::Run run = Run(SettingsKernelSet::New(), [&](CallSpec::Input& in) {
+        plugintest::Run run = plugintest::ExecuteClean(SettingsKernelSet::New(), [&](CallSpec::Input& in) {
             in.SetString("setting", name);
             in.SetString("value", value);
         });
@@ -200,14 +191,14 @@ TEST_F(KernelCommands, ValuesTheTypeRefusesAreReportedAndNothingChanges) {
         EXPECT_NE(run.output->GetErrors()[0].find(std::string("for kernel setting '") + name + "'"), std::string::npos);
         EXPECT_FALSE(run.output->GetResult());
     }
-    plugintest::Run run = Run(SettingsKernelSet::New(), [](CallSpec::Input& in) {
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelSet::New(), [](CallSpec::Input& in) {
         in.SetString("setting", "level");
         in.SetString("value", "256");
     });
     EXPECT_EQ(run.output->GetErrors()[0],
               "Invalid value '256' for kernel setting 'level' of type uint8: expected an unsigned integer "
               "from 0 to 255 (decimal, hexadecimal after 0x, octal after a leading 0)");
-    run = Run(SettingsKernelSet::New(), [](CallSpec::Input& in) {
+    run = plugintest::ExecuteClean(SettingsKernelSet::New(), [](CallSpec::Input& in) {
         in.SetString("setting", "nosuch");
         in.SetString("value", "1");
     });
@@ -217,7 +208,7 @@ TEST_F(KernelCommands, ValuesTheTypeRefusesAreReportedAndNothingChanges) {
 
 TEST_F(KernelCommands, TheDefaultHostHasAFewDozenSettingsOfEveryType) {
     simhost::TempHost host;
-    plugintest::Run run = Run(SettingsKernelList::New());
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKernelList::New());
     std::vector<std::string> rows = Rows(run.output->GetResult());
     EXPECT_GE(rows.size(), 24u);
     for (const char* type : {"|string|", "|bool|", "|uint32|", "|uint8|", "|uint16|"}) {
@@ -228,7 +219,7 @@ TEST_F(KernelCommands, TheDefaultHostHasAFewDozenSettingsOfEveryType) {
     bool dumpFile = false;
     for (const std::string& row : rows) dumpFile = dumpFile || row.rfind("autoCreateDumpFile|bool|", 0) == 0;
     EXPECT_TRUE(dumpFile);
-    run = Run(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetFlag("delta"); });
+    run = plugintest::ExecuteClean(SettingsKernelList::New(), [](CallSpec::Input& in) { in.SetFlag("delta"); });
     EXPECT_FALSE(Rows(run.output->GetResult()).empty());
 }
 

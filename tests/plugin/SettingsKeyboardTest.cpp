@@ -39,24 +39,15 @@ protected:
     void SetUp() override { simhost::trace::Enable(); }
     void TearDown() override { simhost::trace::Disable(); }
 
-    plugintest::Run Run(const plugintest::CommandPtr& command, std::function<void(CallSpec::Input&)> fill = {}) {
-        InputPtr input = CallSpec::Input::New();
-        if (fill) fill(*input);
-        simhost::trace::Take();
-        plugintest::Run run = plugintest::Execute(command, input);
-        EXPECT_FALSE(run.escaped) << run.exception;
-        EXPECT_EQ(run.leaked, 0);
-        return run;
-    }
     std::string Current() {
-        plugintest::Run run = Run(SettingsKeyboardLayoutGet::New());
+        plugintest::Run run = plugintest::ExecuteClean(SettingsKeyboardLayoutGet::New());
         return boost::dynamic_pointer_cast<MetaString>(run.output->GetResult())->GetValue();
     }
     std::string Configured() {
         return nlohmann::json::parse(host_.host().Export())["keyboard"]["configured"];
     }
     plugintest::Run Set(const char* layout, bool persist = true) {
-        return Run(SettingsKeyboardLayoutSet::New(), [&](CallSpec::Input& in) {
+        return plugintest::ExecuteClean(SettingsKeyboardLayoutSet::New(), [&](CallSpec::Input& in) {
             if (layout) in.SetString("layout", layout);
             if (!persist) in.SetFlag("no-persist");
         });
@@ -67,7 +58,7 @@ protected:
 TEST_F(KeyboardCommands, GetAndListReadTheHost) {
     EXPECT_EQ(Current(), "Dutch");
     EXPECT_EQ(simhost::trace::TakeOperations(), (std::vector<std::string>{kNew, kGet}));
-    plugintest::Run run = Run(SettingsKeyboardLayoutList::New());
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKeyboardLayoutList::New());
     std::vector<std::string> names;
     for (const auto& row : boost::dynamic_pointer_cast<MetaList>(run.output->GetResult())->GetElements()) {
         auto layout = boost::dynamic_pointer_cast<MetaStruct>(row);
@@ -79,7 +70,7 @@ TEST_F(KeyboardCommands, GetAndListReadTheHost) {
 
 TEST_F(KeyboardCommands, AHostWithoutLayoutsListsNone) {
     simhost::TempHost empty(R"({"format": 1, "keyboard": {"current": "", "configured": "", "available": []}})");
-    plugintest::Run run = Run(SettingsKeyboardLayoutList::New());
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKeyboardLayoutList::New());
     EXPECT_EQ(boost::dynamic_pointer_cast<MetaList>(run.output->GetResult())->Size(), 0u);
     EXPECT_TRUE(run.output->IsComplete());
     EXPECT_EQ(Current(), "");
@@ -138,7 +129,7 @@ TEST_F(KeyboardCommands, AFailureToApplyComesAfterTheLayoutWasStored) {
 
 TEST_F(KeyboardCommands, TheDefaultHostOffersManyLayouts) {
     simhost::TempHost host;
-    plugintest::Run run = Run(SettingsKeyboardLayoutList::New());
+    plugintest::Run run = plugintest::ExecuteClean(SettingsKeyboardLayoutList::New());
     EXPECT_GE(boost::dynamic_pointer_cast<MetaList>(run.output->GetResult())->Size(), 20u);
     EXPECT_FALSE(Current().empty());
 }
