@@ -46,6 +46,57 @@ function(quarn_static_runtime target)
   endif()
 endfunction()
 
+# target's text starts with the code its commands run, listed by ORDER (a linker script
+# fragment made by scripts/startup-order): a run then touches a few dense pages of the text
+# instead of most of it, and the kernel maps (and counts as resident) the windows around each
+# page touched. GNU ld has no option to order sections, so the linker's own default script for
+# such a target (program or loadable module) is taken, with ORDER included at the head of its
+# .text. GCC builds with function sections only; elsewhere, or when the linker does not show its
+# script, the text keeps the link order.
+function(quarn_startup_order target order)
+  if(NOT QUARN_FUNCTION_SECTIONS)
+    return()
+  endif()
+  get_target_property(type ${target} TYPE)
+  set(probe ${CMAKE_BINARY_DIR}/CMakeFiles/${target}-ld-probe)
+  file(WRITE ${probe}.cpp "int main() { return 0; }\n")
+  # The script depends on the kind of output and on options such as -z now (hardening flags):
+  # the probe links as the target does, with its flags.
+  if(type STREQUAL "EXECUTABLE")
+    set(kind)
+    set(link_flags ${CMAKE_EXE_LINKER_FLAGS})
+  else()
+    set(kind -shared -fPIC)
+    set(link_flags ${CMAKE_MODULE_LINKER_FLAGS})
+  endif()
+  if(QUARN_LINKER_HAS_RELR)
+    list(APPEND kind -Wl,-z,pack-relative-relocs)
+  endif()
+  separate_arguments(flags UNIX_COMMAND "${CMAKE_CXX_FLAGS} ${link_flags}")
+  execute_process(COMMAND ${CMAKE_CXX_COMPILER} ${flags} ${kind} -Wl,--verbose ${probe}.cpp
+    -o ${probe} OUTPUT_VARIABLE out ERROR_QUIET RESULT_VARIABLE rc)
+  set(rule "==================================================\n")
+  string(FIND "${out}" "${rule}" begin)
+  string(FIND "${out}" "\n${rule}" end REVERSE)
+  set(head "  .text           :\n  {\n")
+  string(FIND "${out}" "${head}" text)
+  if(NOT rc EQUAL 0 OR begin EQUAL -1 OR end LESS_EQUAL begin OR text EQUAL -1)
+    message(STATUS "The linker shows no default script: ${target}'s text keeps the link order")
+    return()
+  endif()
+  string(LENGTH "${rule}" skip)
+  math(EXPR begin "${begin} + ${skip}")
+  math(EXPR length "${end} - ${begin} + 1")
+  string(SUBSTRING "${out}" ${begin} ${length} script)
+  string(REPLACE "${head}" "${head}    INCLUDE \"${order}\"\n" script "${script}")
+  set(generated ${CMAKE_BINARY_DIR}/${target}.ld)
+  file(WRITE ${generated}
+    "/* The linker's default script, with ${target}'s startup order at the head of .text. */\n"
+    "${script}")
+  target_link_options(${target} PRIVATE "LINKER:-T,${generated}")
+  set_property(TARGET ${target} APPEND PROPERTY LINK_DEPENDS ${generated} ${order})
+endfunction()
+
 # A loadable module of hidden visibility that compiles against the framework's and the
 # host-control library's headers and links neither them nor the C++ runtime (the program that
 # loads it provides them): the plug-ins, and the host-control library's own modules.

@@ -2,6 +2,8 @@
 // into the default tree: branches in order, then every option, series expanded number-major.
 #include <simhost/domains/Advanced.h>
 
+#include "TextTable.h"
+
 #include <cstdint>
 #include <string>
 
@@ -19,30 +21,66 @@ namespace {
 
 enum class Row { kBranch, kInt, kString, kKind, kSeries, kField, kEnd };
 
+// The entries' texts, which the table holds as offsets (TextTable.h).
+#define BRANCH(path) TEXT(path_, path)
+#define INT(path, min, max, def, value, doc) TEXT(path_, path) TEXT(doc_, doc)
+#define USER_INT INT
+#define STR(path, valid, def, value, doc) \
+    TEXT(path_, path) TEXT(text_, valid) TEXT(def_, def) TEXT(value_, value) TEXT(doc_, doc)
+#define USER_STR STR
+#define KIND(path, kind, value, doc) TEXT(path_, path) TEXT(value_, value) TEXT(doc_, doc)
+#define SERIES(branch, prefix, first, last) TEXT(path_, branch) TEXT(text_, prefix)
+#define FIELD(suffix, min, max, def, doc) TEXT(path_, suffix) TEXT(doc_, doc)
+#define END()
+struct Texts {
+    char none[1];
+#define TEXT SIMHOST_TEXT_MEMBER
+#include "AdvancedOptions.def"
+#undef TEXT
+};
+constexpr Texts kTexts = {
+    "",
+#define TEXT SIMHOST_TEXT_VALUE
+#include "AdvancedOptions.def"
+#undef TEXT
+};
+#undef BRANCH
+#undef INT
+#undef USER_INT
+#undef STR
+#undef USER_STR
+#undef KIND
+#undef SERIES
+#undef FIELD
+#undef END
+
+const char* Text(std::uint32_t offset) { return SIMHOST_TEXT(kTexts, offset); }
+
 struct Entry {
     Row row;
     bool user;
-    const char* path;  // the branch of a series; the suffix of a field
-    const char* text;  // valid characters; the prefix of a series
-    std::int64_t a;    // min; kind; first number of a series
-    std::int64_t b;    // max; last number of a series
-    std::int64_t c;    // integer default
-    std::int64_t d;    // integer value
-    const char* text_default;
-    const char* text_value;
-    const char* description;
+    std::uint32_t path;  // the branch of a series; the suffix of a field
+    std::uint32_t text;  // valid characters; the prefix of a series
+    std::int64_t a;      // min; kind; first number of a series
+    std::int64_t b;      // max; last number of a series
+    std::int64_t c;      // integer default
+    std::int64_t d;      // integer value
+    std::uint32_t text_default;
+    std::uint32_t text_value;
+    std::uint32_t description;
 };
 
+#define AT(field) SIMHOST_TEXT_AT(Texts, field)
 const Entry kEntries[] = {
-#define BRANCH(path) {Row::kBranch, false, path, "", 0, 0, 0, 0, "", "", ""},
-#define INT(path, min, max, def, value, doc) {Row::kInt, false, path, "", min, max, def, value, "", "", doc},
-#define USER_INT(path, min, max, def, value, doc) {Row::kInt, true, path, "", min, max, def, value, "", "", doc},
-#define STR(path, valid, def, value, doc) {Row::kString, false, path, valid, 0, 0, 0, 0, def, value, doc},
-#define USER_STR(path, valid, def, value, doc) {Row::kString, true, path, valid, 0, 0, 0, 0, def, value, doc},
-#define KIND(path, kind, value, doc) {Row::kKind, false, path, "", kind, 0, 0, 0, "", value, doc},
-#define SERIES(branch, prefix, first, last) {Row::kSeries, false, branch, prefix, first, last, 0, 0, "", "", ""},
-#define FIELD(suffix, min, max, def, doc) {Row::kField, false, suffix, "", min, max, def, def, "", "", doc},
-#define END() {Row::kEnd, false, "", "", 0, 0, 0, 0, "", "", ""},
+#define BRANCH(path) {Row::kBranch, false, AT(path_), 0, 0, 0, 0, 0, 0, 0, 0},
+#define INT(path, min, max, def, value, doc) {Row::kInt, false, AT(path_), 0, min, max, def, value, 0, 0, AT(doc_)},
+#define USER_INT(path, min, max, def, value, doc) {Row::kInt, true, AT(path_), 0, min, max, def, value, 0, 0, AT(doc_)},
+#define STR(path, valid, def, value, doc) {Row::kString, false, AT(path_), AT(text_), 0, 0, 0, 0, AT(def_), AT(value_), AT(doc_)},
+#define USER_STR(path, valid, def, value, doc) {Row::kString, true, AT(path_), AT(text_), 0, 0, 0, 0, AT(def_), AT(value_), AT(doc_)},
+#define KIND(path, kind, value, doc) {Row::kKind, false, AT(path_), 0, kind, 0, 0, 0, 0, AT(value_), AT(doc_)},
+#define SERIES(branch, prefix, first, last) {Row::kSeries, false, AT(path_), AT(text_), first, last, 0, 0, 0, 0, 0},
+#define FIELD(suffix, min, max, def, doc) {Row::kField, false, AT(path_), 0, min, max, def, def, 0, 0, AT(doc_)},
+#define END() {Row::kEnd, false, 0, 0, 0, 0, 0, 0, 0, 0, 0},
 #include "AdvancedOptions.def"
 #undef BRANCH
 #undef INT
@@ -54,6 +92,7 @@ const Entry kEntries[] = {
 #undef FIELD
 #undef END
 };
+#undef AT
 
 std::string Replace(std::string text, const std::string& from, const std::string& to) {
     for (std::size_t at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size()))
@@ -69,7 +108,7 @@ Option Integer(const std::string& path, const Entry& entry) {
     option.max = static_cast<std::uint32_t>(entry.b);
     option.default_value = static_cast<std::uint32_t>(entry.c);
     option.value = static_cast<std::uint32_t>(entry.d);
-    option.description = entry.description;
+    option.description = Text(entry.description);
     option.user = entry.user;
     return option;
 }
@@ -80,9 +119,9 @@ void ExpandSeries(const Entry* series, const Entry* fields_end, std::vector<Opti
     for (std::int64_t n = series->a; n <= series->b; ++n) {
         const std::string number = std::to_string(n);
         for (const Entry* field = series + 1; field != fields_end; ++field) {
-            Option option = Integer(std::string(series->path) + "/" + series->text + number + field->path,
+            Option option = Integer(std::string(Text(series->path)) + "/" + Text(series->text) + number + Text(field->path),
                                     *field);
-            option.description = Replace(field->description, "%n", number);
+            option.description = Replace(Text(field->description), "%n", number);
             out.push_back(std::move(option));
         }
     }
@@ -94,20 +133,20 @@ DefaultTree Expand() {
     for (const Entry* entry = kEntries; entry != end; ++entry) {
         switch (entry->row) {
         case Row::kBranch:
-            tree.branches.push_back(entry->path);
+            tree.branches.push_back(Text(entry->path));
             break;
         case Row::kInt:
-            tree.options.push_back(Integer(entry->path, *entry));
+            tree.options.push_back(Integer(Text(entry->path), *entry));
             break;
         case Row::kString:
         case Row::kKind: {
             Option option;
-            option.path = entry->path;
+            option.path = Text(entry->path);
             option.kind = entry->row == Row::kString ? kString : static_cast<int>(entry->a);
-            option.valid_characters = entry->text;
-            option.text_default = entry->text_default;
-            option.text = entry->text_value;
-            option.description = entry->description;
+            option.valid_characters = Text(entry->text);
+            option.text_default = Text(entry->text_default);
+            option.text = Text(entry->text_value);
+            option.description = Text(entry->description);
             option.user = entry->user;
             tree.options.push_back(std::move(option));
             break;

@@ -3,6 +3,8 @@
 // the module's name and version, so every signed module has its own digest and fingerprint.
 #include <simhost/domains/Modules.h>
 
+#include "TextTable.h"
+
 #include <cstdint>
 #include <cstdio>
 #include <string>
@@ -15,25 +17,54 @@ enum State { LOADED, IDLE, OFF, FORCED };
 enum Signer { PLATFORM, PARTNER, COMMUNITY, UNSIGNED };
 enum class Row { kCoreLog, kModule, kParam, kOptions, kLog };
 
+// The entries' texts, which the table holds as offsets (TextTable.h).
+#define CORE_LOG(name, current, def) TEXT(name_, #name)
+#define MODULE(name, license, version, build, state, signer, provides, needs)                 \
+    TEXT(name_, #name) TEXT(a_, license) TEXT(b_, version) TEXT(c_, build) TEXT(provides_, provides) \
+    TEXT(needs_, needs)
+#define PARAM(name, type, doc) TEXT(name_, #name) TEXT(a_, #type) TEXT(b_, doc)
+#define OPTIONS(text) TEXT(a_, text)
+#define LOG(name, current, def) TEXT(name_, #name)
+struct Texts {
+    char none[1];
+#define TEXT SIMHOST_TEXT_MEMBER
+#include "Modules.def"
+#undef TEXT
+};
+constexpr Texts kTexts = {
+    "",
+#define TEXT SIMHOST_TEXT_VALUE
+#include "Modules.def"
+#undef TEXT
+};
+#undef CORE_LOG
+#undef MODULE
+#undef PARAM
+#undef OPTIONS
+#undef LOG
+
+const char* Text(std::uint32_t offset) { return SIMHOST_TEXT(kTexts, offset); }
+
 struct Entry {
     Row row;
-    const char* name;
-    const char* a;  // module: license; param: type; options: the string
-    const char* b;  // module: version; param: description
-    const char* c;  // module: build
-    int state;      // module: State; log: current level
-    int signer;     // module: Signer; log: default level
-    const char* provides;
-    const char* needs;
+    std::uint32_t name;
+    std::uint32_t a;  // module: license; param: type; options: the string
+    std::uint32_t b;  // module: version; param: description
+    std::uint32_t c;  // module: build
+    int state;        // module: State; log: current level
+    int signer;       // module: Signer; log: default level
+    std::uint32_t provides;
+    std::uint32_t needs;
 };
 
+#define AT(field) SIMHOST_TEXT_AT(Texts, field)
 const Entry kEntries[] = {
-#define CORE_LOG(name, current, def) {Row::kCoreLog, #name, "", "", "", current, def, "", ""},
+#define CORE_LOG(name, current, def) {Row::kCoreLog, AT(name_), 0, 0, 0, current, def, 0, 0},
 #define MODULE(name, license, version, build, state, signer, provides, needs) \
-    {Row::kModule, #name, license, version, build, state, signer, provides, needs},
-#define PARAM(name, type, doc) {Row::kParam, #name, #type, doc, "", 0, 0, "", ""},
-#define OPTIONS(text) {Row::kOptions, "", text, "", "", 0, 0, "", ""},
-#define LOG(name, current, def) {Row::kLog, #name, "", "", "", current, def, "", ""},
+    {Row::kModule, AT(name_), AT(a_), AT(b_), AT(c_), state, signer, AT(provides_), AT(needs_)},
+#define PARAM(name, type, doc) {Row::kParam, AT(name_), AT(a_), AT(b_), 0, 0, 0, 0, 0},
+#define OPTIONS(text) {Row::kOptions, 0, AT(a_), 0, 0, 0, 0, 0, 0},
+#define LOG(name, current, def) {Row::kLog, AT(name_), 0, 0, 0, current, def, 0, 0},
 #include "Modules.def"
 #undef CORE_LOG
 #undef MODULE
@@ -41,6 +72,7 @@ const Entry kEntries[] = {
 #undef OPTIONS
 #undef LOG
 };
+#undef AT
 
 // A 64-bit FNV-1a hash, stirred, as the seed of the derived signature bytes.
 std::uint64_t Hash(const std::string& text, std::uint64_t seed) {
@@ -91,11 +123,11 @@ std::vector<Namespace> ParseRequires(const std::string& text) {
 
 Module MakeModule(const Entry& e) {
     Module m;
-    m.name = e.name;
-    m.file = std::string("/usr/lib/norlith/modules/") + e.name + ".nmod";
-    m.license = e.a;
-    m.version = e.b;
-    m.file_version = std::string(e.b) + "-" + e.c;
+    m.name = Text(e.name);
+    m.file = "/usr/lib/norlith/modules/" + m.name + ".nmod";
+    m.license = Text(e.a);
+    m.version = Text(e.b);
+    m.file_version = m.version + "-" + Text(e.c);
     const std::string signed_text = m.name + "@" + m.file_version;
     switch (e.signer) {
     case PLATFORM:
@@ -118,8 +150,8 @@ Module MakeModule(const Entry& e) {
         m.signature_digest = HexBytes(signed_text, 0x5167, 32, false);
         m.signature_fingerprint = HexBytes(signed_text, 0xf19e, 20, true);
     }
-    if (*e.provides) m.provides = ParseNamespace(e.provides);
-    m.requires_ = ParseRequires(e.needs);
+    if (*Text(e.provides)) m.provides = ParseNamespace(Text(e.provides));
+    m.requires_ = ParseRequires(Text(e.needs));
     m.enabled = e.state == LOADED || e.state == IDLE;
     m.loaded = e.state == LOADED || e.state == FORCED;
     return m;
@@ -138,7 +170,7 @@ Expanded Expand() {
         case Row::kLog: {
             LogLevel level;
             level.module = e.row == Row::kLog ? out.modules.back().name : "";
-            level.name = e.name;
+            level.name = Text(e.name);
             level.current = e.state;
             level.default_level = e.signer;
             out.levels.push_back(level);
@@ -148,10 +180,10 @@ Expanded Expand() {
             out.modules.push_back(MakeModule(e));
             break;
         case Row::kParam:
-            out.modules.back().parameters.push_back({e.name, e.a, e.b});
+            out.modules.back().parameters.push_back({Text(e.name), Text(e.a), Text(e.b)});
             break;
         case Row::kOptions:
-            out.modules.back().options = e.a;
+            out.modules.back().options = Text(e.a);
             break;
         }
     }
