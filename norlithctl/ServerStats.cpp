@@ -25,10 +25,10 @@ void ServerStats::FetchAllStats() {
     norlithctl::HostCall([&] {
         Call call(Op::ServerStats_FetchAllStats);
         const simhost::processes::Load load = call.Read<simhost::processes::Load>();
-        std::int64_t running = 0;
-        call.Items<simhost::processes::World>().ForEach([&](const simhost::processes::World& w) {
-            if (w.state == simhost::processes::kRunning) ++running;
-        });
+        // Counted by the store: decoding every world only to read its state cost most of the
+        // command on a host of a few dozen worlds.
+        const std::int64_t running = call.Items<simhost::processes::World>().CountWhere(
+            "state", simhost::processes::kRunning);
         const simhost::boot::Boot boot = call.Read<simhost::boot::Boot>();
         std::optional<std::int64_t> booted = simhost::ParseUtc(boot.booted_at);
         if (!booted)

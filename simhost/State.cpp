@@ -69,6 +69,14 @@ std::int64_t CountItems(Db& db, const char* domain) {
     return count->Step() ? count->Int(0) : 0;
 }
 
+std::int64_t CountItemsWhere(Db& db, const char* domain, const char* member,
+                             const std::string& value) {
+    Query count = db.Cached(
+        "SELECT count(*) FROM items WHERE domain = ?1 AND json_extract(value, ?2) = ?3");
+    count->Bind(1, std::string(domain)).Bind(2, std::string("$.") + member).Bind(3, value);
+    return count->Step() ? count->Int(0) : 0;
+}
+
 void PutItem(Db& db, const char* domain, const std::string& key, const std::string& json) {
     db.Cached("INSERT INTO items(domain, key, value) VALUES (?1, ?2, ?3) "
               "ON CONFLICT(domain, key) DO UPDATE SET value = excluded.value")

@@ -102,6 +102,10 @@ SIMHOST_API void ForEachItemWithPrefix(
     Db& db, const char* domain, const std::string& prefix,
     const std::function<void(const std::string& key, const std::string& json)>& fn);
 SIMHOST_API std::int64_t CountItems(Db& db, const char* domain);
+// Items whose JSON member `member` (a top-level name) equals the text `value`, counted without
+// decoding them; an item that is not JSON fails the count (HostError).
+SIMHOST_API std::int64_t CountItemsWhere(Db& db, const char* domain, const char* member,
+                                         const std::string& value);
 // Replaces an existing item in place, or appends a new one.
 SIMHOST_API void PutItem(Db& db, const char* domain, const std::string& key, const std::string& json);
 SIMHOST_API bool EraseItem(Db& db, const char* domain, const std::string& key);
@@ -178,6 +182,10 @@ public:
             [&](const std::string&, const std::string& text) { fn(Decode(text)); });
     }
     std::int64_t Count() const { return store::CountItems(db_, T::kSection); }
+    // The number of items whose member `member` holds the text `value`.
+    std::int64_t CountWhere(const char* member, const std::string& value) const {
+        return store::CountItemsWhere(db_, T::kSection, member, value);
+    }
 
     // Replaces the item with the same key in place, or appends it; refuses an item that breaks
     // its rules.

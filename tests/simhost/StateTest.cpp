@@ -150,6 +150,23 @@ TEST_F(StateStoreTest, CollectionsKeepTheirOrderAndReplaceInPlace) {
     EXPECT_THROW(mounts.Put({"relative", "tmpfs", "", "", false}), simhost::HostError);
 }
 
+TEST_F(StateStoreTest, ItemsAreCountedByOneMemberWithoutBeingDecoded) {
+    simhost::Session session = simhost::Session::OpenCurrent();
+    simhost::WriteTxn txn(session.db());
+    simhost::Items<simhost::mounts::Mount> mounts(session.db());
+    mounts.Put({"/tmpfs", "ramfs", "tmpfs", "", false});
+    EXPECT_EQ(mounts.CountWhere("type", "tmpfs"), 2);
+    EXPECT_EQ(mounts.CountWhere("type", "ramfs"), 1);
+    EXPECT_EQ(mounts.CountWhere("source", "ramfs"), 0);  // only the named member counts
+    EXPECT_EQ(mounts.CountWhere("type", "tmpfs "), 0);
+    // Another domain's items with the same member are not counted.
+    simhost::store::PutItem(session.db(), "dns_servers", "x", R"({"type": "tmpfs"})");
+    EXPECT_EQ(mounts.CountWhere("type", "tmpfs"), 2);
+    // An item that is not JSON fails the count instead of being skipped.
+    simhost::store::PutItem(session.db(), "mounts", "/broken", "{\"type\": ");
+    EXPECT_THROW(mounts.CountWhere("type", "tmpfs"), simhost::HostError);
+}
+
 TEST_F(StateStoreTest, BootKeepsWhatItsHooksKeep) {
     {
         simhost::Session session = simhost::Session::OpenCurrent();
