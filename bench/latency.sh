@@ -15,7 +15,7 @@ export QUARN_HOST_STATE="$work/host"
 
 for round in $(seq "$rounds"); do
   hyperfine -N --warmup 20 --runs 200 --export-json "$work/round$round.json" \
-    'date -u' "$cli system version get" >/dev/null
+    'date -u' "$cli system version get" >/dev/null 2>&1
 done
 rss_kib="$(/usr/bin/time -f %M "$cli" system version get 2>&1 >/dev/null | tail -1)"
 python3 - "$rss_kib" "$work"/round*.json <<'PY'
