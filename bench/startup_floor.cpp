@@ -27,8 +27,8 @@ int main(int argc, char** argv) {
     }
     sqlite3_stmt* read = nullptr;
     std::string value;
-    if (sqlite3_prepare_v2(db, "SELECT value FROM state LIMIT 1", -1, &read, nullptr) == SQLITE_OK &&
-        sqlite3_step(read) == SQLITE_ROW)
+    const char* sql = "SELECT value FROM state LIMIT 1";
+    if (sqlite3_prepare_v2(db, sql, -1, &read, nullptr) == SQLITE_OK && sqlite3_step(read) == SQLITE_ROW)
         value = reinterpret_cast<const char*>(sqlite3_column_text(read, 0));
     sqlite3_finalize(read);
     sqlite3_close(db);

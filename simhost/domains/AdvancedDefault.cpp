@@ -119,8 +119,9 @@ void ExpandSeries(const Entry* series, const Entry* fields_end, std::vector<Opti
     for (std::int64_t n = series->a; n <= series->b; ++n) {
         const std::string number = std::to_string(n);
         for (const Entry* field = series + 1; field != fields_end; ++field) {
-            Option option = Integer(std::string(Text(series->path)) + "/" + Text(series->text) + number + Text(field->path),
-                                    *field);
+            const std::string path =
+                std::string(Text(series->path)) + "/" + Text(series->text) + number + Text(field->path);
+            Option option = Integer(path, *field);
             option.description = Replace(Text(field->description), "%n", number);
             out.push_back(std::move(option));
         }

@@ -19,9 +19,9 @@ enum class Row { kCoreLog, kModule, kParam, kOptions, kLog };
 
 // The entries' texts, which the table holds as offsets (TextTable.h).
 #define CORE_LOG(name, current, def) TEXT(name_, #name)
-#define MODULE(name, license, version, build, state, signer, provides, needs)                 \
-    TEXT(name_, #name) TEXT(a_, license) TEXT(b_, version) TEXT(c_, build) TEXT(provides_, provides) \
-    TEXT(needs_, needs)
+#define MODULE(name, license, version, build, state, signer, provides, needs)             \
+    TEXT(name_, #name) TEXT(a_, license) TEXT(b_, version) TEXT(c_, build)               \
+    TEXT(provides_, provides) TEXT(needs_, needs)
 #define PARAM(name, type, doc) TEXT(name_, #name) TEXT(a_, #type) TEXT(b_, doc)
 #define OPTIONS(text) TEXT(a_, text)
 #define LOG(name, current, def) TEXT(name_, #name)
