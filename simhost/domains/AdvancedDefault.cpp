@@ -2,8 +2,6 @@
 // into the default tree: branches in order, then every option, series expanded number-major.
 #include <simhost/domains/Advanced.h>
 
-#include "TextTable.h"
-
 #include <cstdint>
 #include <string>
 
@@ -21,41 +19,6 @@ namespace {
 
 enum class Row { kBranch, kInt, kString, kKind, kSeries, kField, kEnd };
 
-// The entries' texts, which the table holds as offsets (TextTable.h).
-#define BRANCH(path) TEXT(path_, path)
-#define INT(path, min, max, def, value, doc) TEXT(path_, path) TEXT(doc_, doc)
-#define USER_INT INT
-#define STR(path, valid, def, value, doc) \
-    TEXT(path_, path) TEXT(text_, valid) TEXT(def_, def) TEXT(value_, value) TEXT(doc_, doc)
-#define USER_STR STR
-#define KIND(path, kind, value, doc) TEXT(path_, path) TEXT(value_, value) TEXT(doc_, doc)
-#define SERIES(branch, prefix, first, last) TEXT(path_, branch) TEXT(text_, prefix)
-#define FIELD(suffix, min, max, def, doc) TEXT(path_, suffix) TEXT(doc_, doc)
-#define END()
-struct Texts {
-    char none[1];
-#define TEXT SIMHOST_TEXT_MEMBER
-#include "AdvancedOptions.def"
-#undef TEXT
-};
-constexpr Texts kTexts = {
-    "",
-#define TEXT SIMHOST_TEXT_VALUE
-#include "AdvancedOptions.def"
-#undef TEXT
-};
-#undef BRANCH
-#undef INT
-#undef USER_INT
-#undef STR
-#undef USER_STR
-#undef KIND
-#undef SERIES
-#undef FIELD
-#undef END
-
-const char* Text(std::uint32_t offset) { return SIMHOST_TEXT(kTexts, offset); }
-
 struct Entry {
     Row row;
     bool user;
@@ -70,29 +33,41 @@ struct Entry {
     std::uint32_t description;
 };
 
-#define AT(field) SIMHOST_TEXT_AT(Texts, field)
-const Entry kEntries[] = {
-#define BRANCH(path) {Row::kBranch, false, AT(path_), 0, 0, 0, 0, 0, 0, 0, 0},
-#define INT(path, min, max, def, value, doc) {Row::kInt, false, AT(path_), 0, min, max, def, value, 0, 0, AT(doc_)},
-#define USER_INT(path, min, max, def, value, doc) {Row::kInt, true, AT(path_), 0, min, max, def, value, 0, 0, AT(doc_)},
-#define STR(path, valid, def, value, doc) {Row::kString, false, AT(path_), AT(text_), 0, 0, 0, 0, AT(def_), AT(value_), AT(doc_)},
-#define USER_STR(path, valid, def, value, doc) {Row::kString, true, AT(path_), AT(text_), 0, 0, 0, 0, AT(def_), AT(value_), AT(doc_)},
-#define KIND(path, kind, value, doc) {Row::kKind, false, AT(path_), 0, kind, 0, 0, 0, 0, AT(value_), AT(doc_)},
-#define SERIES(branch, prefix, first, last) {Row::kSeries, false, AT(path_), AT(text_), first, last, 0, 0, 0, 0, 0},
-#define FIELD(suffix, min, max, def, doc) {Row::kField, false, AT(path_), 0, min, max, def, def, 0, 0, AT(doc_)},
-#define END() {Row::kEnd, false, 0, 0, 0, 0, 0, 0, 0, 0, 0},
-#include "AdvancedOptions.def"
+// The rows, their texts held as offsets (TextTable.inc).
+#define BRANCH(path) TEXT(path_, path) ENTRY(Row::kBranch, false, AT(path_), 0, 0, 0, 0, 0, 0, 0, 0)
+#define INT_ROW(user, path, min, max, def, value, doc) \
+    TEXT(path_, path) TEXT(doc_, doc)                 \
+    ENTRY(Row::kInt, user, AT(path_), 0, min, max, def, value, 0, 0, AT(doc_))
+#define INT(...) INT_ROW(false, __VA_ARGS__)
+#define USER_INT(...) INT_ROW(true, __VA_ARGS__)
+#define STR_ROW(user, path, valid, def, value, doc)                                          \
+    TEXT(path_, path) TEXT(text_, valid) TEXT(def_, def) TEXT(value_, value) TEXT(doc_, doc) \
+    ENTRY(Row::kString, user, AT(path_), AT(text_), 0, 0, 0, 0, AT(def_), AT(value_), AT(doc_))
+#define STR(...) STR_ROW(false, __VA_ARGS__)
+#define USER_STR(...) STR_ROW(true, __VA_ARGS__)
+#define KIND(path, kind, value, doc)                      \
+    TEXT(path_, path) TEXT(value_, value) TEXT(doc_, doc) \
+    ENTRY(Row::kKind, false, AT(path_), 0, kind, 0, 0, 0, 0, AT(value_), AT(doc_))
+#define SERIES(branch, prefix, first, last) \
+    TEXT(path_, branch) TEXT(text_, prefix) \
+    ENTRY(Row::kSeries, false, AT(path_), AT(text_), first, last, 0, 0, 0, 0, 0)
+#define FIELD(suffix, min, max, def, doc) \
+    TEXT(path_, suffix) TEXT(doc_, doc)   \
+    ENTRY(Row::kField, false, AT(path_), 0, min, max, def, def, 0, 0, AT(doc_))
+#define END() ENTRY(Row::kEnd, false, 0, 0, 0, 0, 0, 0, 0, 0, 0)
+#define SIMHOST_TEXT_TABLE "AdvancedOptions.def"
+#include "TextTable.inc"
 #undef BRANCH
+#undef INT_ROW
 #undef INT
 #undef USER_INT
+#undef STR_ROW
 #undef STR
 #undef USER_STR
 #undef KIND
 #undef SERIES
 #undef FIELD
 #undef END
-};
-#undef AT
 
 std::string Replace(std::string text, const std::string& from, const std::string& to) {
     for (std::size_t at = text.find(from); at != std::string::npos; at = text.find(from, at + to.size()))

@@ -3,8 +3,6 @@
 // the module's name and version, so every signed module has its own digest and fingerprint.
 #include <simhost/domains/Modules.h>
 
-#include "TextTable.h"
-
 #include <cstdint>
 #include <cstdio>
 #include <string>
@@ -16,34 +14,6 @@ namespace {
 enum State { LOADED, IDLE, OFF, FORCED };
 enum Signer { PLATFORM, PARTNER, COMMUNITY, UNSIGNED };
 enum class Row { kCoreLog, kModule, kParam, kOptions, kLog };
-
-// The entries' texts, which the table holds as offsets (TextTable.h).
-#define CORE_LOG(name, current, def) TEXT(name_, #name)
-#define MODULE(name, license, version, build, state, signer, provides, needs)             \
-    TEXT(name_, #name) TEXT(a_, license) TEXT(b_, version) TEXT(c_, build)               \
-    TEXT(provides_, provides) TEXT(needs_, needs)
-#define PARAM(name, type, doc) TEXT(name_, #name) TEXT(a_, #type) TEXT(b_, doc)
-#define OPTIONS(text) TEXT(a_, text)
-#define LOG(name, current, def) TEXT(name_, #name)
-struct Texts {
-    char none[1];
-#define TEXT SIMHOST_TEXT_MEMBER
-#include "Modules.def"
-#undef TEXT
-};
-constexpr Texts kTexts = {
-    "",
-#define TEXT SIMHOST_TEXT_VALUE
-#include "Modules.def"
-#undef TEXT
-};
-#undef CORE_LOG
-#undef MODULE
-#undef PARAM
-#undef OPTIONS
-#undef LOG
-
-const char* Text(std::uint32_t offset) { return SIMHOST_TEXT(kTexts, offset); }
 
 struct Entry {
     Row row;
@@ -57,22 +27,28 @@ struct Entry {
     std::uint32_t needs;
 };
 
-#define AT(field) SIMHOST_TEXT_AT(Texts, field)
-const Entry kEntries[] = {
-#define CORE_LOG(name, current, def) {Row::kCoreLog, AT(name_), 0, 0, 0, current, def, 0, 0},
-#define MODULE(name, license, version, build, state, signer, provides, needs) \
-    {Row::kModule, AT(name_), AT(a_), AT(b_), AT(c_), state, signer, AT(provides_), AT(needs_)},
-#define PARAM(name, type, doc) {Row::kParam, AT(name_), AT(a_), AT(b_), 0, 0, 0, 0, 0},
-#define OPTIONS(text) {Row::kOptions, 0, AT(a_), 0, 0, 0, 0, 0, 0},
-#define LOG(name, current, def) {Row::kLog, AT(name_), 0, 0, 0, current, def, 0, 0},
-#include "Modules.def"
+// The rows, their texts held as offsets (TextTable.inc).
+#define LEVEL_ROW(row, name, current, def) \
+    TEXT(name_, #name) ENTRY(row, AT(name_), 0, 0, 0, current, def, 0, 0)
+#define CORE_LOG(...) LEVEL_ROW(Row::kCoreLog, __VA_ARGS__)
+#define LOG(...) LEVEL_ROW(Row::kLog, __VA_ARGS__)
+#define MODULE(name, license, version, build, state, signer, provides, needs)               \
+    TEXT(name_, #name) TEXT(a_, license) TEXT(b_, version) TEXT(c_, build)                 \
+    TEXT(provides_, provides) TEXT(needs_, needs)                                          \
+    ENTRY(Row::kModule, AT(name_), AT(a_), AT(b_), AT(c_), state, signer, AT(provides_), \
+          AT(needs_))
+#define PARAM(name, type, doc)                                 \
+    TEXT(name_, #name) TEXT(a_, #type) TEXT(b_, doc)           \
+    ENTRY(Row::kParam, AT(name_), AT(a_), AT(b_), 0, 0, 0, 0, 0)
+#define OPTIONS(text) TEXT(a_, text) ENTRY(Row::kOptions, 0, AT(a_), 0, 0, 0, 0, 0, 0)
+#define SIMHOST_TEXT_TABLE "Modules.def"
+#include "TextTable.inc"
+#undef LEVEL_ROW
 #undef CORE_LOG
+#undef LOG
 #undef MODULE
 #undef PARAM
 #undef OPTIONS
-#undef LOG
-};
-#undef AT
 
 // A 64-bit FNV-1a hash, stirred, as the seed of the derived signature bytes.
 std::uint64_t Hash(const std::string& text, std::uint64_t seed) {
